@@ -1,0 +1,5 @@
+# OVMACRO_SANITIZE builds everything with AddressSanitizer and UndefinedBehaviorSanitizer; any report aborts.
+if(OVMACRO_SANITIZE)
+  add_compile_options(-fsanitize=address,undefined -fno-sanitize-recover=all -fno-omit-frame-pointer)
+  add_link_options(-fsanitize=address,undefined)
+endif()

@@ -1,0 +1,207 @@
+// Invocation of the variables that the driver finds by name: value variables are replaced by their value;
+// macros read their arguments, bind them in a fresh frame and have their body expanded, evaluated as a typed
+// expression, or evaluated by Python.
+#include <memory>
+
+#include "ovmacro/expander/macro_expander.h"
+#include "ovmacro/expr/expression_parser.h"
+#include "ovmacro/foundations/compose.h"
+#include "ovmacro/foundations/text_format.h"
+#include "ovmacro/lexer/section_scanners.h"
+#include "ovmacro/python/python_bridge.h"
+
+namespace orvan {
+
+namespace {
+
+// "\n    invoking macro m(a,b) with a=x+1, b=y"
+basic_xstring InvokingMacroLine(const LSMacroVariable& m, const xvector<LSVariable*>& bound) {
+    StringStream ss;
+    ss << "\n    invoking macro " << m;
+    if (!bound.empty()) {
+        ss << " with ";
+        for (size_t i = 0; i < bound.size(); ++i) {
+            if (i) ss << ", ";
+            ss << bound[i]->GetName() << "=";
+            bound[i]->WriteValue(ss);
+        }
+    }
+    return ss.GetString();
+}
+
+}  // namespace
+
+void MacroExpander::InvokeVariable(LSVariable* v) {
+    if (v->GetType() != LSV_Macro) {
+        // A value variable is replaced by its value, mapped back to the name.
+        AdvanceWritePos(cursor.begin(), false);
+        WriteCalculatedSubString(BasicSubString(static_cast<LSValueVariable*>(v)->value));
+        return;
+    }
+    auto* m = static_cast<LSMacroVariable*>(v);
+    if (m->IsFnArg()) {
+        InvokeMacroFunction(m);
+        return;
+    }
+
+    const int64 n = m->GetNumArgs();
+    xvector<BasicSubString> actual(static_cast<size_t>(n));
+    if (n > 0) {
+        const LSToken open = ReadToken();
+        if (open.type != TK_LPAREN)
+            throw LexScannerException(
+                Compose("( expected to begin argument list for macro ", *m, " when read ", open), open);
+        for (int64 i = 0; i < n; ++i) {
+            const LSToken end = ScanArgument(cursor, actual[static_cast<size_t>(i)], TK_RPAREN);
+            if (i < n - 1 && end.type == TK_RPAREN)
+                throw LexScannerException(Compose("Insufficient arguments provided for macro ", *m), end);
+            if (i == n - 1 && end.type == TK_COMMA)
+                throw LexScannerException(Compose("Too many arguments provided for macro ", *m), end);
+        }
+    }
+    AdvanceWritePos(cursor.begin(), false);
+
+    // A naked macro binds its arguments, and keeps what its body defines, in the invoker's own frame.
+    std::unique_ptr<VarFrame> ownFrame;
+    VarFrame* bodyFrame = frame;
+    if (!m->IsNaked()) {
+        ownFrame = std::make_unique<VarFrame>(m->GetContext() ? m->GetContext() : frame);
+        bodyFrame = ownFrame.get();
+    }
+
+    xvector<LSVariable*> bound;
+    bound.reserve(static_cast<size_t>(n));
+    for (int64 i = 0; i < n; ++i) {
+        const LSFormalArg& formal = m->GetArg(i);
+        const BasicSubString arg = actual[static_cast<size_t>(i)];
+        LSVariable* binding = nullptr;
+        if (formal.type == LSV_Macro) {
+            // Bound lazily: the argument text is expanded where the body uses it, with the caller's names.
+            auto* argMacro = new LSMacroVariable(LSV_Macro, formal.name, frame, false, false, formal.isFnArg);
+            argMacro->SetSubstitutionString(arg, false, 0);
+            binding = argMacro;
+        } else {
+            basic_xstring value;
+            try {
+                ReadVariableValueByParsingExpression(frame, arg, formal.type, value);
+            } catch (LexScannerException& e) {
+                e.AppendCallContextLine(Compose("\n    passing formal argument ", formal.name, " to macro ", m->GetName()));
+                throw;
+            }
+            binding = new LSValueVariable(formal.type, formal.name, BasicSubString(value));
+        }
+        bodyFrame->AddVariable(binding);
+        bound.push_back(binding);
+    }
+
+    const BasicSubString body = m->GetSubstitutionString();
+    if (m->IsPython()) {
+        const char* position = cursor.begin();
+        try {
+            basic_xstring expression;
+            MacroExpand(nullptr, bodyFrame, body, m->GetIndent(), 0, expression);
+            basic_xstring result;
+            EvalPythonExpression(expression, result, position);
+            WriteCalculatedSubString(BasicSubString(result));
+        } catch (LexScannerException& e) {
+            e.AppendCallContextLine(Compose("\n    invoking python macro ", m->GetName()));
+            throw;
+        }
+        return;
+    }
+    try {
+        if (m->GetReturnType() == LSV_Macro) {
+            MacroExpand(nullptr, bodyFrame, body, m->GetIndent(), GetOutputPos(), *output);
+        } else {
+            basic_xstring value;
+            ReadVariableValueByParsingExpression(bodyFrame, body, m->GetReturnType(), value);
+            WriteCalculatedSubString(BasicSubString(value));
+        }
+    } catch (LexScannerException& e) {
+        e.AppendCallContextLine(InvokingMacroLine(*m, bound));
+        throw;
+    }
+}
+
+void MacroExpander::InvokeMacroFunction(LSMacroVariable* m) {
+    const LSToken open = ReadToken();
+    if (open.type != TK_LPAREN)
+        throw LexScannerException(Compose("( expected to begin argument list for macro ", *m, " when read ", open),
+                                  open);
+    const BasicSubString args = ScanBrackettedSection(cursor, false, TK_LPAREN, TK_RPAREN);
+    AdvanceWritePos(cursor.begin(), false);
+
+    basic_xstring expandedArgs;
+    MacroExpand(nullptr, frame, args, 0, 0, expandedArgs);
+    // The call text lives for the rest of this invocation: positions and names in it stay valid while it is
+    // expanded.
+    const basic_xstring callText = Compose(m->GetSubstitutionString(), "(", expandedArgs, ")");
+    VarFrame* callFrame = m->GetContext() ? m->GetContext() : frame;
+    try {
+        if (m->GetReturnType() == LSV_Macro) {
+            MacroExpand(nullptr, callFrame, BasicSubString(callText), m->GetIndent(), GetOutputPos(), *output);
+        } else {
+            basic_xstring value;
+            ReadVariableValueByParsingExpression(callFrame, BasicSubString(callText), m->GetReturnType(), value);
+            WriteCalculatedSubString(BasicSubString(value));
+        }
+    } catch (LexScannerException& e) {
+        e.AppendCallContextLine(Compose("\n    invoking macro ", *m));
+        throw;
+    }
+}
+
+void ReadVariableValueByParsingExpression(VarFrame* frame, BasicSubString text, ELSVariable type,
+                                          basic_xstring& value) {
+    basic_xstring expanded;
+    {
+        VarFrame child(frame);
+        MacroExpand(nullptr, &child, text, 0, 0, expanded);
+    }
+    try {
+        ExpressionParser parser;
+        parser.Init(BasicSubString(expanded));
+        switch (type) {
+            case LSV_Bool: value = parser.ParseBool(false) ? "true" : "false"; break;
+            case LSV_Int: value = ToString(parser.ParseInt32(false)); break;
+            case LSV_Double: value = ToString(parser.ParseFloat64(false)); break;
+            case LSV_Char: value = MakeSingleQuotedLiteralChar(parser.ParseChar(false)); break;
+            case LSV_String: value = parser.ParseString(false); break;
+            default: return;
+        }
+        if (parser.GetTokenType() != TK_EOS)
+            throw LexScannerException(Compose("Read ", parser.GetToken(), " in middle of expression"), parser.GetToken());
+    } catch (LexScannerException& e) {
+        e.AppendToMessage(Compose("\n    expression: ", expanded));
+        throw;
+    }
+}
+
+basic_xstring MacroExpander::EvaluateString(BasicSubString sectionText, BasicSubString directiveName) {
+    basic_xstring expanded;
+    try {
+        VarFrame child(frame);
+        MacroExpand(nullptr, &child, sectionText, 0, 0, expanded);
+    } catch (LexScannerException& e) {
+        e.AppendToMessage(Compose("\n    in ", directiveName, "(", sectionText, ")"));
+        throw;
+    }
+    try {
+        ExpressionParser parser;
+        parser.GetToken() = LSToken(TK_LPAREN, BasicSubString("("));
+        parser.Init(BasicSubString(expanded));
+        basic_xstring result = parser.ParseString(false);
+        if (parser.GetTokenType() != TK_EOS)
+            throw LexScannerException(Compose("Expected ) after ", parser.lastToken, " when read ", parser.GetToken(),
+                                              " in expression"),
+                                      parser.GetToken());
+        return result;
+    } catch (LexScannerException& e) {
+        StringFindAndReplace(e.GetMessage(), "EOS", ")");
+        e.AppendToMessage(Compose("\n    in ", directiveName, "(", expanded, ")"));
+        e.SetPosition(currentToken.begin());
+        throw;
+    }
+}
+
+}  // namespace orvan

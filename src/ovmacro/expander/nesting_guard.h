@@ -1,0 +1,35 @@
+// Guards against expansions nested without end (a macro that invokes itself, two that invoke each other).
+//
+// Every MacroExpand call counts one level on the calling thread. Past kMaxMacroExpansionDepth levels, or when
+// the thread's stack is close to its end (threads may have small stacks, and sanitizer builds use larger
+// frames), the expansion stops with "Macro expansion nested too deeply" instead of overflowing the stack.
+#pragma once
+
+#include "ovmacro/foundations/types.h"
+
+namespace orvan {
+
+// Large enough for real recursive macros that end (a countdown of some hundreds of levels, each level an
+// invocation and a conditional block), far below what an 8 MiB stack holds.
+inline constexpr int64 kMaxMacroExpansionDepth = 2000;
+// Stack kept free below the deepest expansion, for the handlers that run between two levels.
+inline constexpr int64 kMinFreeStackBytes = 192 * 1024;
+
+class MacroNestingGuard {
+public:
+    // Raises "Macro expansion nested too deeply ..." at position when one more level is too many.
+    explicit MacroNestingGuard(const char* position);
+    ~MacroNestingGuard();
+    MacroNestingGuard(const MacroNestingGuard&) = delete;
+    MacroNestingGuard& operator=(const MacroNestingGuard&) = delete;
+    // True when this guard is the outermost level of the thread.
+    bool IsOutermost() const { return outermost_; }
+
+    // For tests: lowers the depth limit of the calling thread (0 restores the default).
+    static void SetDepthLimitForTesting(int64 limit);
+
+private:
+    bool outermost_;
+};
+
+}  // namespace orvan

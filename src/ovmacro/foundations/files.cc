@@ -1,0 +1,71 @@
+#include "ovmacro/foundations/files.h"
+
+#include <cerrno>
+#include <cstring>
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+namespace orvan {
+
+namespace {
+
+bool ReadAll(int fd, basic_xstring& text, basic_xstring* error) {
+    char buf[1 << 16];
+    for (;;) {
+        const ssize_t n = ::read(fd, buf, sizeof buf);
+        if (n == 0) return true;
+        if (n < 0) {
+            if (errno == EINTR) continue;
+            if (error) *error = std::strerror(errno);
+            return false;
+        }
+        text.append(buf, static_cast<size_t>(n));
+    }
+}
+
+}  // namespace
+
+void ConvertCrLfToLf(basic_xstring& text) {
+    const size_t first = text.find("\r\n");
+    if (first == basic_xstring::npos) return;
+    size_t out = first;
+    for (size_t in = first; in < text.size(); ++in) {
+        if (text[in] == '\r' && in + 1 < text.size() && text[in + 1] == '\n') continue;
+        text[out++] = text[in];
+    }
+    text.resize(out);
+}
+
+bool ReadStringFromFile(const basic_xstring& path, basic_xstring& out, bool textMode, basic_xstring* error) {
+    const int fd = ::open(path.c_str(), O_RDONLY | O_CLOEXEC);
+    if (fd < 0) {
+        if (error) *error = std::strerror(errno);
+        return false;
+    }
+    struct stat st {};
+    if (::fstat(fd, &st) != 0 || !S_ISREG(st.st_mode)) {
+        if (error) *error = S_ISDIR(st.st_mode) ? "Is a directory" : "Not a regular file";
+        ::close(fd);
+        return false;
+    }
+    basic_xstring text;
+    text.reserve(static_cast<size_t>(st.st_size));
+    const bool ok = ReadAll(fd, text, error);
+    ::close(fd);
+    if (!ok) return false;
+    if (textMode) ConvertCrLfToLf(text);
+    out.swap(text);
+    return true;
+}
+
+bool ReadStringFromStdin(basic_xstring& out, bool textMode, basic_xstring* error) {
+    basic_xstring text;
+    if (!ReadAll(0, text, error)) return false;
+    if (textMode) ConvertCrLfToLf(text);
+    out.swap(text);
+    return true;
+}
+
+}  // namespace orvan

@@ -1,0 +1,209 @@
+#include "ovmacro/vars/var_frame.h"
+
+#include <algorithm>
+
+#include "ovmacro/foundations/scanning.h"
+#include "ovmacro/lexer/exceptions.h"
+
+namespace orvan {
+
+namespace {
+
+template <class T>
+bool Contains(const xvector<T>& v, T x) {
+    return std::find(v.begin(), v.end(), x) != v.end();
+}
+
+// Pops the frame pushed on the visiting stack when a guarded lookup returns, also by an exception.
+template <class T>
+struct VisitGuard {
+    VisitGuard(xvector<T>& v, T x) : v(v) { v.push_back(x); }
+    ~VisitGuard() { v.pop_back(); }
+    xvector<T>& v;
+};
+
+}  // namespace
+
+VarFrame::VarFrame(VarFrame* parent) : parent(parent), fileScope(parent ? parent->fileScope : nullptr) {}
+
+VarFrame::VarFrame(FileScopeTag) : parent(nullptr), fileScope(nullptr) {}
+
+VarFrame::~VarFrame() {
+    allImports.clear();
+    directImports.clear();
+}
+
+LSVariable* VarFrame::Find(BasicSubString name, const char* pos) {
+    for (VarFrame* f = this; f; f = f->parent)
+        if (LSVariable* v = f->FindLocal(name, pos)) return v;
+    return nullptr;
+}
+
+LSVariable* VarFrame::FindLocal(BasicSubString name, const char* pos) {
+    xvector<const VarFrame*> visiting;
+    return FindLocalGuarded(name, pos, visiting);
+}
+
+// Frames that import one another in a cycle would make the tie-break recurse without end; a frame already
+// being asked on the current path answers nothing the second time.
+LSVariable* VarFrame::FindLocalGuarded(BasicSubString name, const char* pos, xvector<const VarFrame*>& visiting) {
+    if (LSVariable* v = vars.Find(name)) return v;
+    if (allImports.empty() || Contains(visiting, static_cast<const VarFrame*>(this))) return nullptr;
+    LSVariable* kept = nullptr;
+    for (VarFrame* f : allImports) {
+        if (f == this) continue;
+        LSVariable* v = f->Find2(name);
+        if (!v) continue;
+        if (!kept) {
+            kept = v;
+        } else if (v != kept) {
+            VisitGuard<const VarFrame*> guard(visiting, this);
+            return FindInDirectImportsGuarded(name, pos, visiting);
+        }
+    }
+    return kept;
+}
+
+LSVariable* VarFrame::FindInDirectImports(BasicSubString name, const char* pos) {
+    xvector<const VarFrame*> visiting;
+    VisitGuard<const VarFrame*> guard(visiting, this);
+    return FindInDirectImportsGuarded(name, pos, visiting);
+}
+
+LSVariable* VarFrame::FindInDirectImportsGuarded(BasicSubString name, const char* pos,
+                                                 xvector<const VarFrame*>& visiting) {
+    LSVariable* kept = nullptr;
+    for (VarFrame* f : directImports) {
+        LSVariable* v = f->FindLocalGuarded(name, pos, visiting);
+        if (!v) continue;
+        if (!kept) {
+            kept = v;
+        } else if (v != kept) {
+            StringStream ss;
+            ss << "Ambiguous macro name : " << name;
+            throw LexScannerException(ss.GetString(), pos);
+        }
+    }
+    return kept;
+}
+
+LSVariable* VarFrame::Find2(BasicSubString name) {
+    for (VarFrame* f = this; f; f = f->parent)
+        if (LSVariable* v = f->vars.Find(name)) return v;
+    return nullptr;
+}
+
+void VarFrame::ImportFrame(VarFrame* f) {
+    if (allImports.insert(f).second) {
+        for (VarFrame* g : f->allImports) allImports.insert(g);
+    }
+    directImports.insert(f);
+}
+
+void VarFrame::WriteToStream(xostream& os) const {
+    os << "{\n";
+    {
+        Indenter indent(os, 4);
+        os << "Local vars\n";
+        vars.WriteToStream(os);
+        os << "Parent frame\n";
+        if (parent) parent->WriteToStream(os);
+    }
+    os << "}\n";
+}
+
+FileScopeVarFrame::FileScopeVarFrame() : VarFrame(FileScopeTag{}) { fileScope = this; }
+
+void FileScopeVarFrame::AddImport(FileScopeVarFrame* f) {
+    ImportFrame(f);
+    importedFiles.push_back(f);
+}
+
+void FileScopeVarFrame::InsertDollarMacro(const basic_xstring& name, const basic_xstring& value) {
+    dollarMacros[name] = value;
+    AddVariable(new LSVar(BasicSubString("_" + name + "_"), BasicSubString(value)));
+}
+
+const basic_xstring* FileScopeVarFrame::FindDollarMacro(const basic_xstring& name) const {
+    xvector<const FileScopeVarFrame*> visiting;
+    return FindDollarMacroGuarded(name, visiting);
+}
+
+const basic_xstring* FileScopeVarFrame::FindDollarMacroGuarded(const basic_xstring& name,
+                                                               xvector<const FileScopeVarFrame*>& visiting) const {
+    auto it = dollarMacros.find(name);
+    if (it != dollarMacros.end()) return &it->second;
+    if (Contains(visiting, static_cast<const FileScopeVarFrame*>(this))) return nullptr;  // an import cycle
+    VisitGuard<const FileScopeVarFrame*> guard(visiting, this);
+    for (const FileScopeVarFrame* f : importedFiles)
+        if (const basic_xstring* v = f->FindDollarMacroGuarded(name, visiting)) return v;
+    return nullptr;
+}
+
+const char* ScanDollarMacro(BasicSubString text, BasicSubString& name) {
+    if (text.size() < 4 || text[0] != '$' || text[1] != '(') return nullptr;
+    BasicSubString rest(text.begin() + 2, text.end());
+    const char* nameBegin = rest.begin();
+    if (!ScanIdentifier(rest)) return nullptr;
+    if (rest.empty() || rest.front() != ')') return nullptr;
+    name = BasicSubString(nameBegin, rest.begin());
+    return rest.begin() + 1;
+}
+
+bool FileScopeVarFrame::ApplyDollarMacrosOnePass(xostream& os, BasicSubString text, basic_xstring* lastReplaced) const {
+    bool replaced = false;
+    const char* p = text.begin();
+    const char* runStart = p;
+    while (p < text.end()) {
+        BasicSubString name;
+        const char* after = *p == '$' ? ScanDollarMacro(BasicSubString(p, text.end()), name) : nullptr;
+        if (after) {
+            const basic_xstring key = name.GetString();
+            if (const basic_xstring* value = FindDollarMacro(key)) {
+                os.put(runStart, p - runStart);
+                os << *value;
+                if (lastReplaced) *lastReplaced = key;
+                replaced = true;
+                p = after;
+                runStart = p;
+                continue;
+            }
+        }
+        ++p;
+    }
+    os.put(runStart, p - runStart);
+    return replaced;
+}
+
+bool FileScopeVarFrame::ApplyDollarMacros(xostream& os, BasicSubString text) const {
+    return ApplyDollarMacrosOnePass(os, text, nullptr);
+}
+
+bool FileScopeVarFrame::ApplyDollarMacros(basic_xstring& text) const {
+    // Without a cycle every pass resolves one more level of nesting, and a chain of nested references is at
+    // most as long as the number of distinct macros; a pass beyond that means a macro leads back to itself.
+    size_t macroCount = 0;
+    {
+        xvector<const FileScopeVarFrame*> stack{this}, seen;
+        while (!stack.empty()) {
+            const FileScopeVarFrame* f = stack.back();
+            stack.pop_back();
+            if (Contains(seen, f)) continue;
+            seen.push_back(f);
+            macroCount += f->dollarMacros.size();
+            for (const FileScopeVarFrame* g : f->importedFiles) stack.push_back(g);
+        }
+    }
+    StringStream ss;
+    basic_xstring lastName;
+    if (!ApplyDollarMacrosOnePass(ss, text, &lastName)) return false;
+    for (size_t passes = 1;; ++passes) {
+        basic_xstring next = ss.GetString();
+        text.swap(next);
+        if (!ApplyDollarMacrosOnePass(ss, text, &lastName)) break;
+        if (passes > macroCount) throw LexScannerException("Recursive dollar macro " + lastName, nullptr);
+    }
+    return true;
+}
+
+}  // namespace orvan

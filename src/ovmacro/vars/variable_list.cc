@@ -1,0 +1,39 @@
+#include "ovmacro/vars/variable_list.h"
+
+namespace orvan {
+
+LSVariableList::~LSVariableList() {
+    for (LSVariable* v = first_; v;) {
+        LSVariable* next = v->next;
+        delete v;
+        v = next;
+    }
+    byName_.clear();
+}
+
+void LSVariableList::Add(LSVariable* v) {
+    v->next = first_;
+    first_ = v;
+    byName_.insert_or_assign(v->name, v);
+}
+
+LSVariable* LSVariableList::Find(BasicSubString name) {
+    // Counted in unsigned arithmetic: the diagnostic counter wraps instead of overflowing.
+    if (s_started) s_count = static_cast<std::int32_t>(static_cast<std::uint32_t>(s_count) + 1u);
+    auto it = byName_.find(name);
+    return it == byName_.end() ? nullptr : it->second;
+}
+
+void LSVariableList::WriteToStream(xostream& os) const {
+    os << "{\n";
+    {
+        Indenter indent(os, 4);
+        for (const LSVariable* v = first_; v; v = v->next) {
+            v->WriteToStream(os);
+            os << "\n";
+        }
+    }
+    os << "}\n";
+}
+
+}  // namespace orvan

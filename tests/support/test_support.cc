@@ -1,0 +1,119 @@
+#include "support/test_support.h"
+
+#include <gtest/gtest.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <cstdio>
+#include <fstream>
+#include <random>
+#include <sstream>
+#include <thread>
+
+namespace orvan::testing {
+
+namespace {
+
+std::string ReadFd(int fd) {
+    std::string s;
+    char buf[65536];
+    for (;;) {
+        const ssize_t n = ::read(fd, buf, sizeof buf);
+        if (n < 0 && errno == EINTR) continue;
+        if (n <= 0) break;
+        s.append(buf, static_cast<size_t>(n));
+    }
+    return s;
+}
+
+}  // namespace
+
+ToolResult RunTool(const std::vector<std::string>& args, const std::string& input, const std::string& workingDir) {
+    int inPipe[2], outPipe[2], errPipe[2];
+    if (::pipe(inPipe) || ::pipe(outPipe) || ::pipe(errPipe)) return {};
+    const pid_t pid = ::fork();
+    if (pid == 0) {
+        ::dup2(inPipe[0], 0);
+        ::dup2(outPipe[1], 1);
+        ::dup2(errPipe[1], 2);
+        for (int fd : {inPipe[0], inPipe[1], outPipe[0], outPipe[1], errPipe[0], errPipe[1]}) ::close(fd);
+        if (!workingDir.empty() && ::chdir(workingDir.c_str()) != 0) ::_exit(127);
+        std::vector<char*> argv;
+        std::string tool = OVMACRO_TOOL_PATH;
+        argv.push_back(tool.data());
+        std::vector<std::string> copy = args;
+        for (auto& a : copy) argv.push_back(a.data());
+        argv.push_back(nullptr);
+        ::execv(tool.c_str(), argv.data());
+        ::_exit(127);
+    }
+    ::close(inPipe[0]);
+    ::close(outPipe[1]);
+    ::close(errPipe[1]);
+    // Feed standard input from a thread so that a large input cannot deadlock against full output pipes.
+    std::thread feeder([&] {
+        size_t done = 0;
+        while (done < input.size()) {
+            const ssize_t n = ::write(inPipe[1], input.data() + done, input.size() - done);
+            if (n <= 0) break;
+            done += static_cast<size_t>(n);
+        }
+        ::close(inPipe[1]);
+    });
+    ToolResult r;
+    std::thread errReader([&] { r.err = ReadFd(errPipe[0]); });
+    r.out = ReadFd(outPipe[0]);
+    errReader.join();
+    feeder.join();
+    ::close(outPipe[0]);
+    ::close(errPipe[0]);
+    int status = 0;
+    ::waitpid(pid, &status, 0);
+    r.exitCode = WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status);
+    return r;
+}
+
+TempDir::TempDir() {
+    std::random_device rd;
+    for (;;) {
+        path_ = std::filesystem::temp_directory_path() / ("ovmacro-test-" + std::to_string(rd()));
+        if (std::filesystem::create_directory(path_)) break;
+    }
+}
+
+TempDir::~TempDir() {
+    std::error_code ec;
+    std::filesystem::remove_all(path_, ec);
+}
+
+std::string TempDir::Write(const std::string& relativePath, const std::string& content) const {
+    const std::filesystem::path p = path_ / relativePath;
+    std::filesystem::create_directories(p.parent_path());
+    std::ofstream(p, std::ios::binary) << content;
+    return p.string();
+}
+
+std::string ReadFile(const std::string& path) {
+    std::ifstream in(path, std::ios::binary);
+    std::stringstream ss;
+    ss << in.rdbuf();
+    return ss.str();
+}
+
+std::string MessageOf(const std::function<void()>& fn, const char*& position) {
+    try {
+        fn();
+    } catch (const LexScannerException& e) {
+        position = e.GetPosition();
+        return e.GetMessage();
+    }
+    ADD_FAILURE() << "expected a LexScannerException";
+    return "";
+}
+
+std::string MessageOf(const std::function<void()>& fn) {
+    const char* ignored = nullptr;
+    return MessageOf(fn, ignored);
+}
+
+}  // namespace orvan::testing
