@@ -1,0 +1,333 @@
+// Section scanners: arguments, bracketed sections, body blocks, else detection, token equivalence and the
+// decoding of quoted strings. Nothing here allocates except error messages and the decoded output.
+#include "ovmacro/lexer/section_scanners.h"
+
+#include <algorithm>
+
+#include "ovmacro/foundations/scanning.h"
+#include "ovmacro/lexer/exceptions.h"
+#include "ovmacro/lexer/token_scanner.h"
+
+namespace orvan {
+
+namespace {
+
+using HR = HumanReadableCharInSubString;
+
+[[noreturn]] void Fail(StringStream& ss, const char* position) {
+    throw LexScannerException(ss.GetString(), position);
+}
+
+[[noreturn]] void Fail(const char* message, const char* position) {
+    throw LexScannerException(basic_xstring(message), position);
+}
+
+// The closing partner of an opening bracket kind, or TK_NONE for any other kind.
+EToken ClosingPartner(EToken open) {
+    switch (open) {
+        case TK_LPAREN:
+            return TK_RPAREN;
+        case TK_LBRACE:
+            return TK_RBRACE;
+        case TK_LBRACKET:
+            return TK_RBRACKET;
+        default:
+            return TK_NONE;
+    }
+}
+
+const char* OpeningText(EToken open) {
+    switch (open) {
+        case TK_LPAREN:
+            return "(";
+        case TK_LBRACE:
+            return "{";
+        case TK_LBRACKET:
+            return "[";
+        case TK_LT:
+            return "<";
+        default:
+            return "Opening bracket";
+    }
+}
+
+[[noreturn]] void FailExpectedOpen(const char* openText, const LSToken& found) {
+    StringStream ss;
+    ss << "Expected " << openText << " when read " << found;
+    throw LexScannerException(ss.GetString(), found);
+}
+
+void SkipBlanksWithoutLinefeed(BasicSubString& s) {
+    const char* p = std::find_if_not(s.begin(), s.end(), IsWhiteSpaceWithoutLinefeed);
+    s.SetBegin(p);
+}
+
+// Reads tokens after an opening bracket up to its matching closing bracket and returns that closing token;
+// `s` is left after it. At the end of the input `eosMessage` (+ `eosSuffix`) is raised there.
+LSToken ScanToMatchingClose(BasicSubString& s, EToken open, EToken close, const char* eosMessage,
+                            const char* eosSuffix) {
+    int64 depth = 1;
+    for (;;) {
+        const LSToken t = LsScanToken(s, false);
+        if (t.type == TK_EOS) {
+            StringStream ss;
+            ss << eosMessage << eosSuffix;
+            Fail(ss, s.end());
+        }
+        if (t.type == open) {
+            ++depth;
+        } else if (t.type == close && --depth == 0) {
+            return t;
+        }
+    }
+}
+
+BasicSubString ScanBlockForm(BasicSubString& s, int64& indent, EToken open, EToken close,
+                             const char* openText, const char* closeText) {
+    const LSToken t = LsScanToken(s, false);
+    if (t.type != open) FailExpectedOpen(openText, t);
+    SkipBlanksWithoutLinefeed(s);
+    if (!s.empty() && s.front() == '\n') s.Advance(1);
+    while (!s.empty() && (s.front() == ' ' || s.front() == '\t')) {
+        indent += s.front() == ' ' ? 1 : 4;
+        s.Advance(1);
+    }
+    const char* begin = s.begin();
+    const LSToken closing = ScanToMatchingClose(s, open, close, "Met EOS before closing ", closeText);
+
+    // The line break and indentation in front of a closing bracket on a line of its own are layout, not
+    // content. The look-back stops at the block's beginning: whatever lies before it is not part of the
+    // block.
+    const char* p = closing.text.begin();
+    while (p > begin && (p[-1] == ' ' || p[-1] == '\t')) --p;
+    if (p > begin && p[-1] == '\n') {
+        --p;
+        if (p > begin && p[-1] == '\r') --p;
+    }
+    return BasicSubString(begin, p);
+}
+
+BasicSubString ScanInlineForm(BasicSubString& s, EToken open, EToken close, const char* openText,
+                              const char* closeText, bool openRequired) {
+    const char* first = s.begin();
+    const LSToken t = LsScanToken(s, false);
+    if (t.type != open) {
+        if (openRequired) FailExpectedOpen(openText, t);
+        const char* lineEnd = std::find_if(first, s.end(), [](char c) { return c == '\r' || c == '\n'; });
+        s.SetBegin(lineEnd);
+        return BasicSubString(first, lineEnd);
+    }
+    if (s.empty()) {
+        StringStream ss;
+        ss << "Met EOS before closing " << closeText;
+        Fail(ss, s.end());
+    }
+    // A line break right after the opening bracket, in either convention, only lays the block out.
+    if (s.front() == '\r') s.Advance(1);
+    if (!s.empty() && s.front() == '\n') s.Advance(1);
+    const char* begin = s.begin();
+    const LSToken closing =
+        ScanToMatchingClose(s, open, close, "Met EOS while reading bracketted string", "");
+    return BasicSubString(begin, closing.text.begin());
+}
+
+// Reads "@" and a word; true when the word is `word`.
+bool ScanAtWord(BasicSubString& s, const char* word) {
+    if (LsScanToken(s, false).type != TK_AT) return false;
+    const LSToken t = LsScanToken(s, false);
+    return t.type == TK_IDENTIFIER && t.text == word;
+}
+
+// Decodes the quoted string at the start of s, writing to os when it is not null. Runs of plain characters
+// go out in one write.
+void DecodeQuotedString(BasicSubString s, xostream* os) {
+    if (s.empty()) Fail("Expected quoted string", s.begin());
+    const char quote = s.front();
+    if (quote != '"' && quote != '\'') {
+        StringStream ss;
+        ss << s << " isn't a quoted string";
+        Fail(ss, s.begin());
+    }
+    s.Advance(1);
+    if (s.empty()) Fail("Expected quoted string", s.begin());
+    const char* run = s.begin();
+    for (;;) {
+        if (s.empty()) Fail("Met EOS in middle of string", s.end());
+        const char c = s.front();
+        if (c == quote) break;
+        if (c == '\n') Fail("Met end of line in middle of string", s.begin());
+        if (c != '\\') {
+            s.Advance(1);
+            continue;
+        }
+        if (os) os->put(run, s.begin() - run);
+        s.Advance(1);
+        if (s.empty()) Fail("Met EOS in middle of string", s.end());
+        char decoded = 0;
+        if (s.front() == 'x') {
+            s.Advance(1);
+            int value = 0;
+            for (int i = 0; i < 2; ++i) {
+                if (s.empty()) Fail("Expected hex character when reached EOS", s.end());
+                if (!IsHexDigit(s.front())) {
+                    StringStream ss;
+                    ss << "Expected hex character when read " << HR(s);
+                    Fail(ss, s.begin());
+                }
+                value = value * 16 + MapHexDigit(s.front());
+                s.Advance(1);
+            }
+            decoded = static_cast<char>(static_cast<unsigned char>(value));
+        } else {
+            if (!MapEscapeCharacter(s.front(), decoded)) {
+                StringStream ss;
+                ss << HR(s) << "is not a valid escape character";
+                Fail(ss, s.begin());
+            }
+            s.Advance(1);
+        }
+        if (os) os->put(decoded);
+        run = s.begin();
+    }
+    if (os) os->put(run, s.begin() - run);
+}
+
+}  // namespace
+
+LSToken ScanArgument(BasicSubString& s, BasicSubString& arg, EToken terminator) {
+    ScanWhiteSpace(s);
+    const char* start = s.begin();
+
+    if (!s.empty() && s.front() == '`') {
+        const char* closeQuote = std::find(start + 1, s.end(), '`');
+        if (closeQuote == s.end()) {
+            s.SetBegin(s.end());
+            StringStream ss;
+            ss << "Met EOS while reading argument " << BasicSubString(start, s.end());
+            Fail(ss, s.end());
+        }
+        arg = BasicSubString(start + 1, closeQuote);
+        s.SetBegin(closeQuote + 1);
+        return LsScanToken(s, false);
+    }
+
+    arg = BasicSubString(start, start);
+    // Only one bracket kind is counted at a time, so "(a[b)" is one balanced group.
+    EToken trackedOpen = TK_NONE;
+    EToken trackedClose = TK_NONE;
+    int64 depth = 0;
+    for (;;) {
+        arg.SetEnd(s.begin());
+        const LSToken t = LsScanToken(s, false);
+        if (t.type == TK_EOS) {
+            StringStream ss;
+            ss << "Met EOS while reading argument " << BasicSubString(start, s.end());
+            Fail(ss, s.end());
+        }
+        if (depth == 0) {
+            if (t.type == TK_COMMA || t.type == terminator) return t;
+            const EToken partner = ClosingPartner(t.type);
+            if (partner != TK_NONE) {
+                trackedOpen = t.type;
+                trackedClose = partner;
+                depth = 1;
+            }
+        } else if (t.type == trackedOpen) {
+            ++depth;
+        } else if (t.type == trackedClose) {
+            --depth;
+        }
+    }
+}
+
+BasicSubString ScanBrackettedSection(BasicSubString& s, bool readOpen, EToken open, EToken close) {
+    if (readOpen) {
+        const LSToken t = LsScanToken(s, false);
+        if (t.type != open) {
+            StringStream ss;
+            ss << OpeningText(open) << " expected when read " << t;
+            throw LexScannerException(ss.GetString(), t);
+        }
+    }
+    ScanWhiteSpace(s);
+    // Leading comments belong to the section; trailing white space and comments do not, because the end only
+    // moves to the end of each token read.
+    BasicSubString section(s.begin(), s.begin());
+    int64 depth = 1;
+    for (;;) {
+        const LSToken t = LsScanToken(s, false);
+        if (t.type == TK_EOS) Fail("Met EOS while reading bracketted section", s.end());
+        if (t.type == open) {
+            ++depth;
+        } else if (t.type == close && --depth == 0) {
+            return section;
+        }
+        section.SetEnd(t.text.end());
+    }
+}
+
+BasicSubString ScanRndBrackettedSection(BasicSubString& s, bool readOpen) {
+    return ScanBrackettedSection(s, readOpen, TK_LPAREN, TK_RPAREN);
+}
+
+BasicSubString ScanSquareBrackettedSection(BasicSubString& s, bool readOpen) {
+    return ScanBrackettedSection(s, readOpen, TK_LBRACKET, TK_RBRACKET);
+}
+
+BasicSubString ScanCurlyBrackettedSection(BasicSubString& s, bool readOpen) {
+    return ScanBrackettedSection(s, readOpen, TK_LBRACE, TK_RBRACE);
+}
+
+BasicSubString ScanStringBlock(BasicSubString& s, int64& indent, EToken open, EToken close,
+                               const char* openText, const char* closeText, bool openRequired) {
+    indent = 0;
+    SkipBlanksWithoutLinefeed(s);
+    if (s.empty()) {
+        StringStream ss;
+        ss << "Expected " << openText << " when read EOS";
+        Fail(ss, s.end());
+    }
+    if (s.front() == '\n') return ScanBlockForm(s, indent, open, close, openText, closeText);
+    return ScanInlineForm(s, open, close, openText, closeText, openRequired);
+}
+
+BasicSubString ScanSubstString(BasicSubString& s, int64& indent) {
+    return ScanStringBlock(s, indent, TK_LBRACE, TK_RBRACE, "{", "}", false);
+}
+
+BasicSubString ScanRndBrackettedString(BasicSubString& s, int64& indent) {
+    return ScanStringBlock(s, indent, TK_LPAREN, TK_RPAREN, "(", ")", true);
+}
+
+bool ScanElseBlock(BasicSubString& s) {
+    return ScanAtWord(s, "else");
+}
+
+bool ScanElseIfBlock(BasicSubString& s) {
+    return ScanAtWord(s, "elseif");
+}
+
+bool SubStringsAreTokenEquivalent(BasicSubString a, BasicSubString b) {
+    for (;;) {
+        const LSToken ta = LsScanToken(a, false);
+        const LSToken tb = LsScanToken(b, false);
+        if (ta.type == TK_EOS) return tb.type == TK_EOS;
+        if (ta.type != tb.type || ta.text != tb.text) return false;
+    }
+}
+
+void UnstringifyQuotedString(BasicSubString s, xostream& os) {
+    DecodeQuotedString(s, nullptr);
+    DecodeQuotedString(s, &os);
+}
+
+int64 ScanBackwardsThroughSpacesAndTabs(BasicSubString& s) {
+    int64 width = 0;
+    while (!s.empty() && (s.back() == ' ' || s.back() == '\t')) {
+        width += s.back() == ' ' ? 1 : 4;
+        s.SetEnd(s.end() - 1);
+    }
+    return width;
+}
+
+}  // namespace orvan
