@@ -1,0 +1,205 @@
+// The directives that turn text into text: the @str family (C-style string literals), @unstr, @quote,
+// @( expression ), @[ text ] (double expansion), @print and @println.
+#include <algorithm>
+#include <memory>
+
+#include "ovmacro/expander/macro_expander.h"
+#include "ovmacro/expr/expression_parser.h"
+#include "ovmacro/foundations/compose.h"
+#include "ovmacro/foundations/scanning.h"
+#include "ovmacro/foundations/text_format.h"
+#include "ovmacro/lexer/section_scanners.h"
+
+namespace orvan {
+
+namespace {
+
+// Expands text in a child frame of `frame` into a string; definitions made by the text die with that frame.
+basic_xstring ExpandInChildFrame(VarFrame* frame, BasicSubString text, int64 inputIndent) {
+    basic_xstring expanded;
+    VarFrame child(frame);
+    MacroExpand(nullptr, &child, text, inputIndent, 0, expanded);
+    return expanded;
+}
+
+// Lines of a multi-line result start at the column where the directive stood, not at the expander's own
+// indentation; the old indentation comes back when the directive ends, also when an error passes.
+class OutputIndentOverride {
+public:
+    OutputIndentOverride(int64& outputIndent, int64 column) : ref_(outputIndent), saved_(outputIndent) {
+        ref_ = column;
+    }
+    ~OutputIndentOverride() { ref_ = saved_; }
+    OutputIndentOverride(const OutputIndentOverride&) = delete;
+    OutputIndentOverride& operator=(const OutputIndentOverride&) = delete;
+
+private:
+    int64& ref_;
+    int64 saved_;
+};
+
+// The newest variable of each frame from `frame` outward, to see afterwards whether a nested expansion added
+// definitions that outlive it.
+xvector<const LSVariable*> NewestVariables(VarFrame* frame) {
+    xvector<const LSVariable*> newest;
+    for (VarFrame* f = frame; f; f = f->GetParent()) newest.push_back(f->vars.First());
+    return newest;
+}
+
+// The outermost frame from `frame` outward whose newest variable is no longer the one recorded, or null.
+VarFrame* OutermostChangedFrame(VarFrame* frame, const xvector<const LSVariable*>& newest) {
+    VarFrame* changed = nullptr;
+    size_t i = 0;
+    for (VarFrame* f = frame; f && i < newest.size(); f = f->GetParent(), ++i)
+        if (f->vars.First() != newest[i]) changed = f;
+    return changed;
+}
+
+}  // namespace
+
+void WritePrefix(xostream& os, EStrLiteralMode mode) {
+    if (mode == SLM_Wide) os << 'L';
+    os << '"';
+}
+
+void WriteSuffix(xostream& os, EStrLiteralMode /*mode*/) {
+    os << '"';
+}
+
+void MacroExpander::ProcessStrDirective(bool isX, EStrLiteralMode mode) {
+    int64 indent = 0;
+    const BasicSubString argument = ScanRndBrackettedString(cursor, indent);
+    AdvanceWritePos(cursor.begin(), false);
+    const basic_xstring expanded = ExpandInChildFrame(frame, argument, indent);
+
+    const OutputIndentOverride lineUp(outputIndent, GetOutputPos());
+    StringStream literal;
+    WritePrefix(literal, mode);
+    bool wroteLine = false;
+    for (const char c : expanded) {
+        if (isX && c == '\n') {
+            // One literal per line: the line feed stays inside the literal as \n, and the next literal
+            // starts on a new output line, lined up under the first.
+            literal << "\\n";
+            WriteSuffix(literal, mode);
+            literal << '\n';
+            const basic_xstring line = literal.GetString();
+            WriteCalculatedSubString(BasicSubString(line));
+            wroteLine = true;
+            WritePrefix(literal, mode);
+        } else {
+            WriteCharForCStyleLiteralConstants(literal, c);
+        }
+    }
+    WriteSuffix(literal, mode);
+    const basic_xstring last = literal.GetString();
+    // After a final line feed the narrow form would end with an empty "" of its own: it adds nothing and is
+    // dropped. The wide L"" is kept (it is 3 characters long).
+    if (!wroteLine || last.size() >= 3) WriteCalculatedSubString(BasicSubString(last));
+}
+
+void MacroExpander::ProcessUnstrDirective() {
+    const BasicSubString section = ScanBrackettedSection(cursor, true, TK_LPAREN, TK_RPAREN);
+    AdvanceWritePos(cursor.begin(), false);
+    const basic_xstring expanded = ExpandInChildFrame(frame, section, 0);
+    StringStream decoded;
+    try {
+        UnstringifyQuotedString(BasicSubString(expanded), decoded);
+    } catch (LexScannerException& e) {
+        // The decoded text is a temporary: the error is reported at the directive, where the user sees the
+        // closing bracket rather than an end of text.
+        StringFindAndReplace(e.GetMessage(), "EOS", ")");
+        e.AppendToMessage(Compose("\n    in @unstr(", expanded, ")"));
+        e.SetPosition(currentToken.begin());
+        throw;
+    }
+    const OutputIndentOverride lineUp(outputIndent, GetOutputPos());
+    WriteCalculatedSubString(BasicSubString(decoded.str()));
+}
+
+void MacroExpander::ProcessQuoteDirective() {
+    int64 indent = 0;
+    BasicSubString rest = ScanRndBrackettedString(cursor, indent);
+    AdvanceWritePos(cursor.begin(), false);
+    const OutputIndentOverride lineUp(outputIndent, GetOutputPos());
+    // Copied line by line so that every line keeps its mapping to the source; the argument's own indentation
+    // is removed from each line after the first.
+    for (;;) {
+        const char* lf = std::find(rest.begin(), rest.end(), '\n');
+        if (lf == rest.end()) {
+            WriteSubStringFromSourceFile(rest);
+            return;
+        }
+        WriteSubStringFromSourceFile(BasicSubString(rest.begin(), lf + 1));
+        rest.SetBegin(lf + 1);
+        ScanIndentation(rest, indent, 4);
+    }
+}
+
+void MacroExpander::ProcessRndBracketDirective() {
+    const BasicSubString section = ScanBrackettedSection(cursor, false, TK_LPAREN, TK_RPAREN);
+    AdvanceWritePos(cursor.begin(), false);
+    const basic_xstring expanded = ExpandInChildFrame(frame, section, 0);
+    basic_xstring value;
+    try {
+        ExpressionParser parser;
+        parser.GetToken() = LSToken(TK_LPAREN, BasicSubString("("));
+        parser.Init(BasicSubString(expanded));
+        // Any type is accepted and written as its text.
+        value = parser.ParseString(true);
+        if (parser.GetTokenType() != TK_EOS)
+            throw LexScannerException(Compose("Expected ) after ", parser.lastToken, " when read ",
+                                              parser.GetToken(), " in expression"),
+                                      parser.GetToken());
+    } catch (LexScannerException& e) {
+        StringFindAndReplace(e.GetMessage(), "EOS", ")");
+        e.AppendToMessage(Compose("\n    in @(", expanded, ")"));
+        e.SetPosition(currentToken.begin());
+        throw;
+    }
+    WriteCalculatedSubString(BasicSubString(value));
+}
+
+void MacroExpander::ProcessSqrBracketDirective() {
+    const BasicSubString section = ScanBrackettedSection(cursor, false, TK_LBRACKET, TK_RBRACKET);
+    AdvanceWritePos(cursor.begin(), false);
+    // The text of the second pass is held by a variable, not a plain string: definitions that the second
+    // pass exports to an outer frame (@exportdef, @def +) keep views of this text as their names and bodies,
+    // so the text must live as long as the frame that received them. Its name " @[" can never be looked up
+    // (no identifier holds a blank), so the holder stays invisible there.
+    auto holder =
+        std::make_unique<LSVar>(BasicSubString(" @["), BasicSubString(ExpandInChildFrame(frame, section, 0)));
+    const BasicSubString first(holder->value);
+    const xvector<const LSVariable*> newest = NewestVariables(frame);
+    basic_xstring second;
+    try {
+        VarFrame child(frame);
+        MacroExpand(nullptr, &child, first, 0, 0, second);
+    } catch (LexScannerException& e) {
+        StringFindAndReplace(e.GetMessage(), "EOS", "]");
+        e.AppendToMessage(Compose("\n    in @[", first, "]"));
+        e.SetPosition(currentToken.begin());
+        if (VarFrame* keeper = OutermostChangedFrame(frame, newest)) keeper->AddVariable(holder.release());
+        throw;
+    }
+    if (VarFrame* keeper = OutermostChangedFrame(frame, newest)) keeper->AddVariable(holder.release());
+    WriteCalculatedSubString(BasicSubString(second));
+}
+
+void MacroExpander::ProcessPrintDirective(bool newLine) {
+    const BasicSubString section = ScanBrackettedSection(cursor, true, TK_LPAREN, TK_RPAREN);
+    AdvanceWritePos(cursor.begin(), false);
+    const basic_xstring expanded = ExpandInChildFrame(frame, section, 0);
+    xostream& out = xcout();
+    out << expanded;
+    if (newLine) out << '\n';
+    out.flush();
+    ScanOverWhiteSpaceAfterDirective();
+}
+
+basic_xstring MacroExpander::ParseStringExpressionInBrackets(BasicSubString directiveName, bool readOpen) {
+    const BasicSubString section = ScanBrackettedSection(cursor, readOpen, TK_LPAREN, TK_RPAREN);
+    return EvaluateString(section, directiveName);
+}
+
+}  // namespace orvan
