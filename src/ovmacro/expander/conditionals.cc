@@ -33,7 +33,8 @@ bool EvaluateConditionText(VarFrame* frame, BasicSubString condition, BasicSubSt
         VarFrame child(frame);
         MacroExpand(nullptr, &child, condition, 0, 0, expanded);
     } catch (LexScannerException& e) {
-        e.AppendToMessage(Compose("\n    in ", directiveName, "(", condition, ")"));
+        // A call-chain line: a condition that invokes itself would otherwise add one line per level.
+        e.AppendCallContextLine(Compose("\n    in ", directiveName, "(", condition, ")"));
         throw;
     }
     try {

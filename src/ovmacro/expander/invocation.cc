@@ -1,6 +1,7 @@
 // Invocation of the variables that the driver finds by name: value variables are replaced by their value;
 // macros read their arguments, bind them in a fresh frame and have their body expanded, evaluated as a typed
 // expression, or evaluated by Python.
+#include <cstdint>
 #include <memory>
 
 #include "ovmacro/expander/macro_expander.h"
@@ -146,6 +147,10 @@ void MacroExpander::InvokeMacroFunction(LSMacroVariable* m) {
             WriteCalculatedSubString(BasicSubString(value));
         }
     } catch (LexScannerException& e) {
+        // Errors in the call text itself would point into callText, which dies here: they move to the call.
+        const auto p = reinterpret_cast<std::uintptr_t>(e.GetPosition());
+        const auto callBegin = reinterpret_cast<std::uintptr_t>(callText.data());
+        if (p >= callBegin && p <= callBegin + callText.size()) e.SetPosition(currentToken.begin());
         e.AppendCallContextLine(Compose("\n    invoking macro ", *m));
         throw;
     }
@@ -173,6 +178,8 @@ void ReadVariableValueByParsingExpression(VarFrame* frame, BasicSubString text, 
             throw LexScannerException(Compose("Read ", parser.GetToken(), " in middle of expression"), parser.GetToken());
     } catch (LexScannerException& e) {
         e.AppendToMessage(Compose("\n    expression: ", expanded));
+        // The error points into the expanded text, which dies here: it moves to the text that was expanded.
+        e.SetPosition(text.begin());
         throw;
     }
 }
@@ -183,7 +190,7 @@ basic_xstring MacroExpander::EvaluateString(BasicSubString sectionText, BasicSub
         VarFrame child(frame);
         MacroExpand(nullptr, &child, sectionText, 0, 0, expanded);
     } catch (LexScannerException& e) {
-        e.AppendToMessage(Compose("\n    in ", directiveName, "(", sectionText, ")"));
+        e.AppendCallContextLine(Compose("\n    in ", directiveName, "(", sectionText, ")"));
         throw;
     }
     try {

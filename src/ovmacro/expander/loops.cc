@@ -108,7 +108,8 @@ void MacroExpander::ProcessForDirective() {
         try {
             MacroExpand(nullptr, &iterationFrame, block, indent, blockOutputIndent, *output);
         } catch (LexScannerException& e) {
-            e.AppendToMessage(Compose("\n    in @for directive when ", singleName, " = ", item));
+            // A call-chain line: a block that invokes itself would otherwise add one line per level.
+            e.AppendCallContextLine(Compose("\n    in @for directive when ", singleName, " = ", item));
             throw;
         }
         if (end.type == TK_RBRACKET) break;
