@@ -3,15 +3,16 @@
 #include <cstdio>
 #include <cstring>
 #include <string>
+#include <utility>
+#include <vector>
 
-#include <unistd.h>
-
+#include "file_host.h"
 #include "options.h"
-#include "ovmacro/expander/macro_expander.h"
 #include "ovmacro/foundations/files.h"
-#include "ovmacro/foundations/scanning.h"
+#include "ovmacro/python/python_bridge.h"
 
 using namespace orvan;
+using ovmacro_tool::FileHost;
 using ovmacro_tool::Options;
 
 namespace {
@@ -37,6 +38,40 @@ bool WriteFileAtomically(const std::string& path, const std::string& text, std::
     return true;
 }
 
+// The -D definitions as the lines of a text that is expanded before FILE, one "@def" line each, so that an
+// error in one is reported at its line of "<command line>".
+std::string DefinitionsText(const Options& options) {
+    std::string text;
+    // An empty rest of line would make the definition look for its body in braces on the next line.
+    for (const auto& [name, body] : options.defines)
+        text += "@def " + name + " = " + (body.empty() ? "{}" : body) + "\n";
+    return text;
+}
+
+// A file name as Make reads it: blanks, '#' and '$' would otherwise end or change the name.
+std::string MakeEscaped(const std::string& name) {
+    std::string out;
+    for (char c : name) {
+        if (c == ' ' || c == '\t' || c == '#') out += '\\';
+        if (c == '$') out += '$';
+        out += c;
+    }
+    return out;
+}
+
+// "TARGET: FILE IMPORTED...", then an empty rule for each imported file, so that Make does not fail when
+// one of them is removed.
+std::string DependencyText(const Options& options, const FileHost& host) {
+    const std::string target = options.outputPath.empty() ? options.inputPath : options.outputPath;
+    const std::vector<std::string> imported = host.ImportedFileNames();
+    std::string text = MakeEscaped(target) + ":";
+    if (options.inputPath != "-") text += " " + MakeEscaped(options.inputPath);
+    for (const std::string& name : imported) text += " " + MakeEscaped(name);
+    text += "\n";
+    for (const std::string& name : imported) text += "\n" + MakeEscaped(name) + ":\n";
+    return text;
+}
+
 }  // namespace
 
 int main(int argc, char** argv) {
@@ -54,41 +89,51 @@ int main(int argc, char** argv) {
         std::printf("ovmacro %s\n", OVMACRO_VERSION);
         return 0;
     }
+    if (options.noPython) SetPythonAllowed(false);
 
-    const bool fromStdin = options.inputPath == "-";
-    const std::string displayName = fromStdin ? "<stdin>" : options.inputPath;
-    std::string text;
-    const bool read = fromStdin ? ReadStringFromStdin(text, true, &error)
-                                : ReadStringFromFile(options.inputPath, text, true, &error);
-    if (!read) {
-        std::fprintf(stderr, "ovmacro: cannot read %s: %s\n", displayName.c_str(), error.c_str());
+    // The list of loaded files outlives the frame, whose variables are named by views into their texts.
+    MpfwSourceFileList files;
+    MpfwFrame frame(files);
+    FileHost host(frame, options.includeDirs);
+
+    if (!options.defines.empty() &&
+        host.LoadText("<command line>", DefinitionsText(options)) != FileHost::Load::kOk)
+        return kExitExpansionError;
+
+    FileHost::Load load;
+    if (options.inputPath == "-") {
+        std::string text;
+        if (!ReadStringFromStdin(text, true, &error)) {
+            std::fprintf(stderr, "ovmacro: cannot read <stdin>: %s\n", error.c_str());
+            return kExitUsage;
+        }
+        load = host.LoadText("<stdin>", std::move(text));
+    } else {
+        load = host.LoadFile(options.inputPath, error);
+    }
+    if (load == FileHost::Load::kUnreadable) {
+        std::fprintf(stderr, "ovmacro: cannot read %s: %s\n", options.inputPath.c_str(), error.c_str());
         return kExitUsage;
     }
+    if (load == FileHost::Load::kFailed) return kExitExpansionError;
+    std::fflush(stdout);  // text printed while expanding comes before what follows
 
-    FileScopeVarFrame frame;
-    std::string result;
-    try {
-        MacroExpand(nullptr, &frame, BasicSubString(text), 0, 0, result);
-    } catch (const LexScannerException& e) {
-        const int64 line = GetLineNumber(BasicSubString(text), e.GetPosition());
-        if (line >= 0)
-            std::fprintf(stderr, "\n%s(%lld) : %s\n", displayName.c_str(), static_cast<long long>(line),
-                         e.GetMessage().c_str());
-        else
-            std::fprintf(stderr, "\n%s\n", e.GetMessage().c_str());
-        return kExitExpansionError;
-    }
-    std::fflush(stdout);  // text printed while expanding comes before the expansion
+    if (options.settings && !host.PrintSettings(xcout())) return kExitExpansionError;
 
+    const std::string& result = host.LastLoaded()->expandedText;
     if (options.outputPath.empty()) {
-        if (std::fwrite(result.data(), 1, result.size(), stdout) != result.size() || std::fflush(stdout) != 0) {
+        if (!options.settings && (std::fwrite(result.data(), 1, result.size(), stdout) != result.size() ||
+                                  std::fflush(stdout) != 0)) {
             std::fprintf(stderr, "ovmacro: cannot write standard output\n");
             return kExitUsage;
         }
-        return 0;
-    }
-    if (!WriteFileAtomically(options.outputPath, result, error)) {
+    } else if (!WriteFileAtomically(options.outputPath, result, error)) {
         std::fprintf(stderr, "ovmacro: cannot write %s: %s\n", options.outputPath.c_str(), error.c_str());
+        return kExitUsage;
+    }
+    if (!options.depsPath.empty() &&
+        !WriteFileAtomically(options.depsPath, DependencyText(options, host), error)) {
+        std::fprintf(stderr, "ovmacro: cannot write %s: %s\n", options.depsPath.c_str(), error.c_str());
         return kExitUsage;
     }
     return 0;

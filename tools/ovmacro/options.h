@@ -2,6 +2,7 @@
 #pragma once
 
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace ovmacro_tool {
@@ -9,6 +10,11 @@ namespace ovmacro_tool {
 struct Options {
     std::string inputPath = "-";  // "-" is standard input
     std::string outputPath;       // empty: standard output
+    std::string depsPath;         // --deps: where the Make dependency file goes; empty: none
+    std::vector<std::pair<std::string, std::string>> defines;  // -D NAME=TEXT, in order
+    std::vector<std::string> includeDirs;                      // -I DIR, in order
+    bool settings = false;  // --settings: print the settings instead of the expansion
+    bool noPython = false;  // --no-python: refuse embedded Python code
     bool help = false;
     bool version = false;
 };

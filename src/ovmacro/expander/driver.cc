@@ -138,6 +138,19 @@ void MacroExpander::DispatchDirective(const LSToken& directive, const char* star
         AdvanceWritePos(cursor.begin(), false);
         return;
     }
+    // "@[", "@(" and "@$" are directives whose token is not a word. A dollar definition is one only where
+    // there is an import handler, that is at the top level of a file.
+    if (directive.type == TK_LBRACKET || directive.type == TK_LPAREN ||
+        (directive.type == TK_DOLLAR && importHandler)) {
+        AdvanceWritePos(start, true);
+        if (directive.type == TK_LBRACKET)
+            ProcessSqrBracketDirective();
+        else if (directive.type == TK_LPAREN)
+            ProcessRndBracketDirective();
+        else
+            ProcessDollarDefDirective();
+        return;
+    }
     if (directive.type != TK_IDENTIFIER) return;  // no directive: the '@' and the token are ordinary text
 
     // The directive words in the order they are tested. A flushed directive first writes the blanks pending
@@ -149,6 +162,9 @@ void MacroExpander::DispatchDirective(const LSToken& directive, const char* star
         void (*handler)(MacroExpander&);
     };
     static constexpr Row kRows[] = {
+        {"import", false, [](MacroExpander& e) { e.ProcessImportDirective(); }},
+        {"importpath", false, [](MacroExpander& e) { e.ProcessImportPathDirective(); }},
+        {"relativepath", true, [](MacroExpander& e) { e.ProcessRelativePathDirective(); }},
         {"if", true, [](MacroExpander& e) { e.ProcessIfDirective(); }},
         {"while", true, [](MacroExpander& e) { e.ProcessWhileDirective(); }},
         {"for", true, [](MacroExpander& e) { e.ProcessForDirective(); }},
@@ -157,9 +173,25 @@ void MacroExpander::DispatchDirective(const LSToken& directive, const char* star
         {"nakeddef", false, [](MacroExpander& e) { e.ProcessDefDirective(false, true, false); }},
         {"defpython", false, [](MacroExpander& e) { e.ProcessDefDirective(false, false, true); }},
         {"runpython", false, [](MacroExpander& e) { e.ProcessRunPythonDirective(); }},
+        {"str", true, [](MacroExpander& e) { e.ProcessStrDirective(false, SLM_Narrow); }},
+        {"strx", true, [](MacroExpander& e) { e.ProcessStrDirective(true, SLM_Narrow); }},
+        {"strW", true, [](MacroExpander& e) { e.ProcessStrDirective(false, SLM_Wide); }},
+        {"strxW", true, [](MacroExpander& e) { e.ProcessStrDirective(true, SLM_Wide); }},
+        {"unstr", true, [](MacroExpander& e) { e.ProcessUnstrDirective(); }},
+        {"scope", true, [](MacroExpander& e) { e.ProcessScopeDirective(); }},
+        {"quote", true, [](MacroExpander& e) { e.ProcessQuoteDirective(); }},
+        {"print", false, [](MacroExpander& e) { e.ProcessPrintDirective(false); }},
+        {"println", false, [](MacroExpander& e) { e.ProcessPrintDirective(true); }},
+        {"assert", false, [](MacroExpander& e) { e.ProcessAssertDirective(); }},
+        {"assertfails", false, [](MacroExpander& e) { e.ProcessAssertFailsDirective(); }},
+        {"fail", false, [](MacroExpander& e) { e.ProcessFailDirective(); }},
+        {"let", false, [](MacroExpander& e) { e.ProcessLetDirective(); }},
     };
     const BasicSubString word = directive.text;
     if (word == "else") throw LexScannerException("@else with no matching @if directive", directive);
+    // Imports are the business of the host's handler, which only the top-level expansion of a file has.
+    if (!importHandler && (word == "import" || word == "importpath"))
+        throw LexScannerException("@" + word.GetString() + " statement not allowed here", directive);
     for (const Row& row : kRows) {
         if (word != row.word) continue;
         if (row.flush) AdvanceWritePos(start, true);

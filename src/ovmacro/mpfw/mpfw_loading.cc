@@ -1,0 +1,103 @@
+// Loading project description files: reading, recording, expanding, and following their imports.
+#include <algorithm>
+#include <memory>
+#include <utility>
+
+#include "ovmacro/expander/macro_expander.h"
+#include "ovmacro/foundations/files.h"
+#include "ovmacro/foundations/paths.h"
+#include "ovmacro/mpfw/mpfw_parser.h"
+
+namespace orvan {
+
+namespace {
+
+// Keeps a file's name on the chain of files being expanded while its expansion runs.
+class ExpansionChainEntry {
+public:
+    ExpansionChainEntry(xvector<basic_xstring>& chain, const basic_xstring& name) : chain_(chain) {
+        chain_.push_back(name);
+    }
+    ~ExpansionChainEntry() { chain_.pop_back(); }
+    ExpansionChainEntry(const ExpansionChainEntry&) = delete;
+    ExpansionChainEntry& operator=(const ExpansionChainEntry&) = delete;
+
+private:
+    xvector<basic_xstring>& chain_;
+};
+
+}  // namespace
+
+MpfwSourceFile* MpfwParser::CreateMpfwSourceFile() {
+    return new MpfwSourceFile;
+}
+
+MpfwSourceFile* MpfwParser::AddFile(const basic_xstring& path, BasicSubString extra) {
+    basic_xstring text;
+    if (!ReadStringFromFile(path, text, true)) throw LexScannerException("Couldn't open file " + path, token);
+    text.append(extra.view());
+    return AddFileWithText(path, std::move(text));
+}
+
+MpfwSourceFile* MpfwParser::AddFileWithText(const basic_xstring& name, basic_xstring text) {
+    std::unique_ptr<MpfwSourceFile> owned(CreateMpfwSourceFile());
+    MpfwSourceFile* file = owned.get();
+    file->fileName = name;
+    file->text = std::move(text);
+    mpfwFrame->sourceFiles.AddSrcFile(owned.release());
+
+    ExpansionChainEntry entry(expanding_, name);
+    try {
+        MacroExpand(this, &mpfwFrame->varFrame, BasicSubString(file->text), 0, 0, file->expandedText,
+                    file->pieces);
+    } catch (LexScannerException& e) {
+        // An imported file's expansion is not the outermost one, which would otherwise count the context
+        // lines left out; the report is written here, so count them here.
+        e.AppendOmittedContextCount();
+        TracerX trace;
+        mpfwFrame->sourceFiles.WriteLexScannerError(trace, e);
+        return nullptr;
+    }
+    return file;
+}
+
+bool MpfwParser::HandleImportPath(const basic_xstring& path, const char* position) {
+    basic_xstring dir = path;
+    ApplyMacrosAt(dir, position);
+    NormalisePath(dir);
+    mpfwFrame->importPaths.push_back(std::move(dir));
+    return true;
+}
+
+bool MpfwParser::HandleImport(VarFrame*, const basic_xstring& fileName, const char* position) {
+    basic_xstring name = fileName;
+    ApplyMacrosAt(name, position);
+    basic_xstring fullPath;
+    if (!ResolveFile(name, fullPath)) throw LexScannerException("Couldn't open file " + name, position);
+    // A file that imports itself, directly or through others, would be expanded again and again.
+    if (std::find(expanding_.begin(), expanding_.end(), fullPath) != expanding_.end())
+        throw LexScannerException("Recursive import of file " + fullPath, position);
+    try {
+        return AddFile(fullPath, BasicSubString()) != nullptr;
+    } catch (LexScannerException& e) {
+        // A file that resolved but cannot be read (AddFile reports expansion errors itself): the place to
+        // show is the import, not whatever token the parser last read.
+        e.SetPosition(position);
+        throw;
+    }
+}
+
+bool MpfwParser::ApplyMacros(basic_xstring& text) {
+    return ApplyMacrosAt(text, token.text.begin());
+}
+
+bool MpfwParser::ApplyMacrosAt(basic_xstring& text, const char* pos) {
+    try {
+        return mpfwFrame->varFrame.ApplyDollarMacros(text);
+    } catch (LexScannerException& e) {
+        if (!e.GetPosition()) e.SetPosition(pos);
+        throw;
+    }
+}
+
+}  // namespace orvan

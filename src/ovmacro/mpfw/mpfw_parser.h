@@ -1,0 +1,105 @@
+// MpfwParser: loads project description files and offers the steps from which a host reads their settings.
+//
+// As an ImportHandler it loads a file, records it in the frame's source-file list and expands it in the one
+// file-scope frame of the MpfwFrame, loading every file that the text imports at the point of its @import. As
+// an ExpressionParser it then reads an expanded text: an import line, a dollar definition, a string or path
+// setting. A host derives from it and says how an imported name becomes a path and what an import means to
+// it:
+//
+//     class Host : public MpfwParser {
+//         bool ResolveFile(const basic_xstring& name, basic_xstring& fullPath) override;
+//         void OnImport(MpfwSourceFile* file) override;
+//     };
+//     MpfwSourceFileList files;
+//     MpfwFrame frame(files);
+//     Host host(frame);
+//     if (MpfwSourceFile* f = host.AddFile("root.ovp", {})) {  // errors are reported on standard error
+//         host.Init(f->expandedText);
+//         while (host.ParseImportDirective() || host.ParseMacroDef()) {}
+//     }
+//
+// The frame, its list and the recorded files must outlive the parser.
+#pragma once
+
+#include "ovmacro/expander/import_handler.h"
+#include "ovmacro/expr/expression_parser.h"
+#include "ovmacro/mpfw/mpfw_frame.h"
+
+namespace orvan {
+
+class MpfwParser : public ExpressionParser, public ImportHandler {
+public:
+    explicit MpfwParser(MpfwFrame& frame) : mpfwFrame(&frame) {}
+    MpfwParser(const MpfwParser&) = delete;
+    MpfwParser& operator=(const MpfwParser&) = delete;
+    ~MpfwParser() override = default;
+
+    // Loading.
+
+    // Reads the file (CR LF read as LF), appends `extra`, records it and expands it. A file that cannot be
+    // read raises "Couldn't open file " + path at the current token. An expansion error is written as a
+    // report (file and line) to standard error; the file stays recorded and the result is null.
+    MpfwSourceFile* AddFile(const basic_xstring& path, BasicSubString extra);
+    // The same for a text that the host already holds (standard input, text made by the host), recorded
+    // under `name`.
+    MpfwSourceFile* AddFileWithText(const basic_xstring& name, basic_xstring text);
+
+    // A directory in which later imports may be searched: dollar macros applied, normalised, appended to
+    // the frame's import paths.
+    bool HandleImportPath(const basic_xstring& path, const char* position) override;
+    // Resolves the name (dollar macros applied) and loads the file, expanded at this point in the shared
+    // frame. An import of a file that is still being expanded raises "Recursive import of file " + path.
+    bool HandleImport(VarFrame* frame, const basic_xstring& fileName, const char* position) override;
+    // A new, empty record; a host may make a type derived from MpfwSourceFile.
+    virtual MpfwSourceFile* CreateMpfwSourceFile();
+    // The path under which an imported name is read and recorded; false if there is no such file. A host
+    // should give one path per file, since imports in progress are recognised by it.
+    virtual bool ResolveFile(const basic_xstring& name, basic_xstring& fullPath) = 0;
+    // Tells the host that the text being read imports `file` (the recorded file of that path, or null).
+    virtual void OnImport(MpfwSourceFile* file) = 0;
+
+    // Replaces the references to defined dollar macros in text, repeatedly; true if anything was replaced.
+    bool ApplyMacros(basic_xstring& text);
+
+    // Reading an expanded text (after Init). Each step looks at the current token.
+
+    // "@import" and a quoted name: resolves it and reports it through OnImport. False, consuming nothing,
+    // unless the current token is "@".
+    bool ParseImportDirective();
+    // "$NAME = value" or "$NAME = path value" (normalised): defines the dollar macro NAME. False, consuming
+    // nothing, unless the current token is "$".
+    bool ParseMacroDef();
+    bool ParseMacroDef(basic_xstring& name, basic_xstring& value);
+    // "$NAME = "text"" with the name the host expects here; the double-quoted text is taken as it stands.
+    void ParseStringSetting(const basic_xstring& name, basic_xstring& value);
+    // The same for a path: forward slashes only and no trailing slash (an empty path is accepted).
+    void ParsePathSetting(const basic_xstring& name, basic_xstring& value);
+    // The common part of the two: leaves the quoted literal current.
+    void ParseStringSettingHelper(const basic_xstring& name, basic_xstring& value);
+    // The decoded text of the current quoted literal, dollar macros applied; the token is not consumed.
+    basic_xstring ParseQuotedString();
+    // ParseQuotedString, refusing backslashes.
+    basic_xstring ParseFileOrDirName();
+    // A quoted literal or a parenthesised string expression, dollar macros applied.
+    void ReadString(basic_xstring& value);
+
+    // The file and line of the current token, traced back from the expanded text being read to its source.
+    bool GetFilenameAndLineNumberAtCurrentPosition(basic_xstring& file, int64& line) const override;
+
+    MpfwFrame* GetMpfwFrame() const { return mpfwFrame; }
+
+protected:
+    // The names of the files being expanded, outermost first: the last one is the file whose expansion is
+    // running now, which an import inside it comes from.
+    const xvector<basic_xstring>& GetFilesBeingExpanded() const { return expanding_; }
+
+    MpfwFrame* mpfwFrame;
+
+private:
+    // ApplyMacros, placing an error without a position (a dollar macro that leads back to itself) at pos.
+    bool ApplyMacrosAt(basic_xstring& text, const char* pos);
+
+    xvector<basic_xstring> expanding_;
+};
+
+}  // namespace orvan
