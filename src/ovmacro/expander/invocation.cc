@@ -159,27 +159,31 @@ void MacroExpander::InvokeMacroFunction(LSMacroVariable* m) {
 void ReadVariableValueByParsingExpression(VarFrame* frame, BasicSubString text, ELSVariable type,
                                           basic_xstring& value) {
     basic_xstring expanded;
+    OutputPieces pieces;
     {
         VarFrame child(frame);
-        MacroExpand(nullptr, &child, text, 0, 0, expanded);
+        MacroExpand(nullptr, &child, text, 0, 0, expanded, pieces);
     }
     try {
         ExpressionParser parser;
         parser.Init(BasicSubString(expanded));
+        basic_xstring result;
         switch (type) {
-            case LSV_Bool: value = parser.ParseBool(false) ? "true" : "false"; break;
-            case LSV_Int: value = ToString(parser.ParseInt32(false)); break;
-            case LSV_Double: value = ToString(parser.ParseFloat64(false)); break;
-            case LSV_Char: value = MakeSingleQuotedLiteralChar(parser.ParseChar(false)); break;
-            case LSV_String: value = parser.ParseString(false); break;
+            case LSV_Bool: result = parser.ParseBool(false) ? "true" : "false"; break;
+            case LSV_Int: result = ToString(parser.ParseInt32(false)); break;
+            case LSV_Double: result = ToString(parser.ParseFloat64(false)); break;
+            case LSV_Char: result = MakeSingleQuotedLiteralChar(parser.ParseChar(false)); break;
+            case LSV_String: result = parser.ParseString(false); break;
             default: return;
         }
         if (parser.GetTokenType() != TK_EOS)
             throw LexScannerException(Compose("Read ", parser.GetToken(), " in middle of expression"), parser.GetToken());
+        value.swap(result);
     } catch (LexScannerException& e) {
         e.AppendToMessage(Compose("\n    expression: ", expanded));
-        // The error points into the expanded text, which dies here: it moves to the text that was expanded.
-        e.SetPosition(text.begin());
+        // The error points into the expanded text, which dies here: it moves back to the source character
+        // that produced the faulty text.
+        MovePositionOutOfExpansion(e, BasicSubString(expanded), pieces, text);
         throw;
     }
 }

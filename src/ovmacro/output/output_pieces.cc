@@ -53,6 +53,16 @@ void OutputPieces::AdjustErrorPosition(LexScannerException& e, BasicSubString ex
     e.SetPosition(MapOutputPositionToAddress(offset));
 }
 
+void MovePositionOutOfExpansion(LexScannerException& e, BasicSubString expanded, const OutputPieces& pieces,
+                                BasicSubString source) {
+    const char* pos = e.GetPosition();
+    const std::less<const char*> lt;
+    if (!pos || lt(pos, expanded.begin()) || lt(expanded.end(), pos)) return;
+    const int64 offset = pos - expanded.begin();
+    const char* mapped = offset < pieces.size() ? pieces.MapOutputPositionToAddress(offset) : source.end();
+    e.SetPosition(mapped ? mapped : source.begin());
+}
+
 const char* OutputPiecesMonotonePosMapper::MapOutputPositionToAddress(int64 pos) {
     const xvector<OutputPiece>& pieces = pieces_->GetPieces();
     if (pos < offset_ || pos >= pieces_->size()) PositionOutsideOutput(pos, pieces_->size());

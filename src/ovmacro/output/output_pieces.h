@@ -51,6 +51,13 @@ private:
     int64 total_ = 0;
 };
 
+// For an error raised while reading `expanded`, a temporary expansion of `source` described by `pieces`:
+// moves a position inside `expanded` back to the source character that produced it (the end of `expanded`
+// becomes the end of `source`; inserted indentation, which maps nowhere, becomes the begin of `source`), so
+// that the error can be reported at a line of a loaded text. Other positions are left alone.
+void MovePositionOutOfExpansion(LexScannerException& e, BasicSubString expanded, const OutputPieces& pieces,
+                                BasicSubString source);
+
 // Maps a non-decreasing sequence of output positions in one pass over the pieces.
 class OutputPiecesMonotonePosMapper {
 public:
