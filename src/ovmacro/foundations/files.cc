@@ -39,7 +39,8 @@ void ConvertCrLfToLf(basic_xstring& text) {
 }
 
 bool ReadStringFromFile(const basic_xstring& path, basic_xstring& out, bool textMode, basic_xstring* error) {
-    const int fd = ::open(path.c_str(), O_RDONLY | O_CLOEXEC);
+    // Opened without blocking, so that a FIFO or a device is refused below instead of waiting for a writer.
+    const int fd = ::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK);
     if (fd < 0) {
         if (error) *error = std::strerror(errno);
         return false;
@@ -50,6 +51,7 @@ bool ReadStringFromFile(const basic_xstring& path, basic_xstring& out, bool text
         ::close(fd);
         return false;
     }
+    ::fcntl(fd, F_SETFL, ::fcntl(fd, F_GETFL) & ~O_NONBLOCK);
     basic_xstring text;
     text.reserve(static_cast<size_t>(st.st_size));
     const bool ok = ReadAll(fd, text, error);
