@@ -6,6 +6,53 @@
 
 namespace orvan {
 
+namespace {
+
+// The blanks and tabs that begin every line holding code (blank lines aside), as Python's textwrap.dedent
+// finds them. A block opened with "{" at the end of the directive's line reports no indentation, yet users
+// indent its lines under the directive; Python refuses indented top-level code, so that common prefix goes.
+std::string_view CommonIndentation(std::string_view code) {
+    std::string_view common;
+    bool first = true;
+    for (size_t lineStart = 0; lineStart < code.size();) {
+        size_t lineEnd = code.find('\n', lineStart);
+        if (lineEnd == std::string_view::npos) lineEnd = code.size();
+        const std::string_view line = code.substr(lineStart, lineEnd - lineStart);
+        const size_t textStart = line.find_first_not_of(" \t\r");
+        if (textStart != std::string_view::npos) {
+            const std::string_view indent = line.substr(0, textStart);
+            if (first) {
+                common = indent;
+                first = false;
+            } else {
+                size_t n = 0;
+                while (n < common.size() && n < indent.size() && common[n] == indent[n]) ++n;
+                common = common.substr(0, n);
+            }
+        }
+        lineStart = lineEnd + 1;
+    }
+    return common;
+}
+
+basic_xstring RemoveCommonIndentation(const basic_xstring& code) {
+    const std::string_view common = CommonIndentation(code);
+    if (common.empty()) return code;
+    basic_xstring out;
+    out.reserve(code.size());
+    for (size_t lineStart = 0; lineStart < code.size();) {
+        size_t lineEnd = code.find('\n', lineStart);
+        lineEnd = lineEnd == basic_xstring::npos ? code.size() : lineEnd + 1;
+        std::string_view line(code.data() + lineStart, lineEnd - lineStart);
+        if (line.substr(0, common.size()) == common) line.remove_prefix(common.size());
+        out.append(line);
+        lineStart = lineEnd;
+    }
+    return out;
+}
+
+}  // namespace
+
 void MacroExpander::ProcessRunPythonDirective() {
     // Just after the word; a Python error is finally placed at the '@' (below), since the code that failed is
     // an expanded copy, not the source.
@@ -24,7 +71,10 @@ void MacroExpander::ProcessRunPythonDirective() {
     // An empty block does nothing and, in particular, does not start the interpreter.
     if (!code.empty()) {
         StringStream program(4096);
-        WriteSubStringWithAdjustedIndent(program, BasicSubString(code), indent);
+        if (indent > 0)
+            WriteSubStringWithAdjustedIndent(program, BasicSubString(code), indent);
+        else
+            program << RemoveCommonIndentation(code);
         program << '\n';
         try {
             RunPython("", program.GetString(), position);
