@@ -28,10 +28,13 @@ public:
     // Writes n characters. While an Indenter is active, each line that the run begins is indented first.
     xostream& put(const char* p, int64 n) {
         if (n <= 0) return *this;
-        if (indent_ > 0)
+        if (indent_ > 0) {
             WriteIndented(p, n);
-        else
+        } else {
             DoWrite(p, static_cast<size_t>(n));
+            // Kept up to date without an Indenter too, so that one made later knows whether it is mid-line.
+            atLineStart_ = p[n - 1] == '\n';
+        }
         return *this;
     }
     xostream& put(char c) { return put(&c, 1); }

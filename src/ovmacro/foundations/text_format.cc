@@ -43,6 +43,9 @@ basic_xstring ToString(double v) {
 
 namespace {
 
+// In a character literal a control byte is written as a two-digit hex escape, which the token scanner reads
+// back to the byte (it knows no octal escapes) and which C reads unambiguously before the closing quote. In
+// a string literal it is three-digit octal, because a C hex escape would swallow the hex digits that follow.
 void WriteEscapedChar(xostream& os, char c, char quote) {
     const unsigned char u = static_cast<unsigned char>(c);
     switch (c) {
@@ -55,6 +58,10 @@ void WriteEscapedChar(xostream& os, char c, char quote) {
     if (c == quote) {
         const char esc[2] = {'\\', c};
         os.put(esc, 2);
+    } else if ((u < 0x20 || u == 0x7f) && quote == '\'') {
+        static constexpr char kHex[] = "0123456789ABCDEF";
+        const char esc[4] = {'\\', 'x', kHex[u >> 4], kHex[u & 15]};
+        os.put(esc, 4);
     } else if (u < 0x20 || u == 0x7f) {
         const char esc[4] = {'\\', static_cast<char>('0' + (u >> 6)), static_cast<char>('0' + ((u >> 3) & 7)),
                              static_cast<char>('0' + (u & 7))};

@@ -22,7 +22,8 @@ int64 FormatDouble(double v, char* buf);
 void WriteCharForCStyleLiteralConstants(xostream& os, char c);
 // The text as a double-quoted C literal, escaped as above.
 basic_xstring MakeDoubleQuotedString(BasicSubString text);
-// The character as a single-quoted C literal (the single quote is escaped instead of the double quote).
+// The character as a single-quoted C literal (the single quote is escaped instead of the double quote, and
+// other control bytes as \xHH, so that the token scanner reads the literal back to the same byte).
 basic_xstring MakeSingleQuotedLiteralChar(char c);
 
 // Writes text, removing up to `indent` columns of indentation (blank 1, tab 4) after each line feed.

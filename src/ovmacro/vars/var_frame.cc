@@ -1,6 +1,7 @@
 #include "ovmacro/vars/var_frame.h"
 
 #include <algorithm>
+#include <string>
 
 #include "ovmacro/foundations/scanning.h"
 #include "ovmacro/lexer/exceptions.h"
@@ -150,7 +151,17 @@ const char* ScanDollarMacro(BasicSubString text, BasicSubString& name) {
     return rest.begin() + 1;
 }
 
+namespace {
+
+thread_local int64 t_dollarMacroTextLimit = 0;  // 0: kMaxDollarMacroTextSize
+
+}  // namespace
+
+void FileScopeVarFrame::SetDollarMacroTextLimitForTesting(int64 limit) { t_dollarMacroTextLimit = limit; }
+
 bool FileScopeVarFrame::ApplyDollarMacrosOnePass(xostream& os, BasicSubString text, basic_xstring* lastReplaced) const {
+    const int64 limit = t_dollarMacroTextLimit > 0 ? t_dollarMacroTextLimit : kMaxDollarMacroTextSize;
+    int64 written = 0;  // checked before each replacement is written, so that a pass never builds more
     bool replaced = false;
     const char* p = text.begin();
     const char* runStart = p;
@@ -160,6 +171,10 @@ bool FileScopeVarFrame::ApplyDollarMacrosOnePass(xostream& os, BasicSubString te
         if (after) {
             const basic_xstring key = name.GetString();
             if (const basic_xstring* value = FindDollarMacro(key)) {
+                written += (p - runStart) + static_cast<int64>(value->size());
+                if (written + (text.end() - after) > limit)
+                    throw LexScannerException(
+                        "Dollar macro replacement longer than " + std::to_string(limit) + " characters", nullptr);
                 os.put(runStart, p - runStart);
                 os << *value;
                 if (lastReplaced) *lastReplaced = key;
@@ -180,8 +195,10 @@ bool FileScopeVarFrame::ApplyDollarMacros(xostream& os, BasicSubString text) con
 }
 
 bool FileScopeVarFrame::ApplyDollarMacros(basic_xstring& text) const {
-    // Without a cycle every pass resolves one more level of nesting, and a chain of nested references is at
-    // most as long as the number of distinct macros; a pass beyond that means a macro leads back to itself.
+    // Without a cycle every pass either resolves one more level of nesting (a chain of nested references is at
+    // most as long as the number of distinct macros) or completes a name whose pieces earlier passes wrote,
+    // which uses up at least three characters of the text ("$(D)" replaced by "$" shortens it by three). More
+    // passes than that mean that a macro leads back to itself.
     size_t macroCount = 0;
     {
         xvector<const FileScopeVarFrame*> stack{this}, seen;
@@ -197,11 +214,12 @@ bool FileScopeVarFrame::ApplyDollarMacros(basic_xstring& text) const {
     StringStream ss;
     basic_xstring lastName;
     if (!ApplyDollarMacrosOnePass(ss, text, &lastName)) return false;
+    const size_t passLimit = macroCount + ss.str().size() / 3 + 1;
     for (size_t passes = 1;; ++passes) {
         basic_xstring next = ss.GetString();
         text.swap(next);
         if (!ApplyDollarMacrosOnePass(ss, text, &lastName)) break;
-        if (passes > macroCount) throw LexScannerException("Recursive dollar macro " + lastName, nullptr);
+        if (passes > passLimit) throw LexScannerException("Recursive dollar macro " + lastName, nullptr);
     }
     return true;
 }

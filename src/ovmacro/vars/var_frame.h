@@ -54,9 +54,18 @@ private:
     LSVariable* FindInDirectImportsGuarded(BasicSubString name, const char* pos, xvector<const VarFrame*>& visiting);
 };
 
+// The longest text that dollar macro replacement builds. A replacement may name another macro twice, so a few
+// definitions can describe a text that doubles with every level of nesting; past this size replacement stops
+// with "Dollar macro replacement longer than N characters" instead of exhausting memory. Real replacements
+// (file names, paths, settings) are far shorter.
+inline constexpr int64 kMaxDollarMacroTextSize = int64{1} << 24;
+
 class FileScopeVarFrame : public VarFrame {
 public:
     FileScopeVarFrame();
+
+    // For fuzzers and tests: lowers kMaxDollarMacroTextSize for the calling thread (0 restores it).
+    static void SetDollarMacroTextLimitForTesting(int64 limit);
 
     // ImportFrame(f), and f is listed among the imported files.
     void AddImport(FileScopeVarFrame* f);
@@ -67,8 +76,9 @@ public:
     // One pass of replacement of text into os; true if anything was replaced.
     bool ApplyDollarMacros(xostream& os, BasicSubString text) const;
     // Replacement in place until nothing is left to replace; true if the first pass replaced anything.
-    // A macro whose replacement leads back to itself raises "Recursive dollar macro " + name, with no
-    // position: callers that know one set it.
+    // A macro whose replacement leads back to itself raises "Recursive dollar macro " + name, and a text that
+    // grows past kMaxDollarMacroTextSize "Dollar macro replacement longer than ...", both with no position:
+    // callers that know one set it.
     bool ApplyDollarMacros(basic_xstring& text) const;
 
     xvector<const FileScopeVarFrame*> importedFiles;
