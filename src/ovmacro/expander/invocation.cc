@@ -1,9 +1,9 @@
 // Invocation of the variables that the driver finds by name: value variables are replaced by their value;
 // macros read their arguments, bind them in a fresh frame and have their body expanded, evaluated as a typed
 // expression, or evaluated by Python.
-#include <cstdint>
 #include <memory>
 
+#include "ovmacro/expander/held_text.h"
 #include "ovmacro/expander/macro_expander.h"
 #include "ovmacro/expr/expression_parser.h"
 #include "ovmacro/foundations/compose.h"
@@ -133,24 +133,32 @@ void MacroExpander::InvokeMacroFunction(LSMacroVariable* m) {
     AdvanceWritePos(cursor.begin(), false);
 
     basic_xstring expandedArgs;
-    MacroExpand(nullptr, frame, args, 0, 0, expandedArgs);
-    // The call text lives for the rest of this invocation: positions and names in it stay valid while it is
-    // expanded.
-    const basic_xstring callText = Compose(m->GetSubstitutionString(), "(", expandedArgs, ")");
+    OutputPieces argPieces;
+    MacroExpand(nullptr, frame, args, 0, 0, expandedArgs, argPieces);
+    // The call text is a held text: what it defines in the call's frame keeps it alive, and a position in it
+    // moves back to where its characters came from: the bound text, the expanded arguments, and for the
+    // brackets the call itself.
+    const BasicSubString bound = m->GetSubstitutionString();
+    OutputPieces callPieces;
+    callPieces.push_back(OutputPiece(bound, 0));
+    callPieces.push_back(OutputPiece(currentToken, 1));
+    for (const OutputPiece& p : argPieces.GetPieces()) callPieces.push_back(p);
+    callPieces.push_back(OutputPiece(currentToken, 1));
     VarFrame* callFrame = m->GetContext() ? m->GetContext() : frame;
+    HeldTextKeeper keeper(callFrame);
+    const HeldText& held = keeper.Hold(std::make_unique<HeldText>(
+        " call", Compose(bound, "(", expandedArgs, ")"), std::move(callPieces), currentToken));
+    const BasicSubString callText = held.GetText();
     try {
         if (m->GetReturnType() == LSV_Macro) {
-            MacroExpand(nullptr, callFrame, BasicSubString(callText), m->GetIndent(), GetOutputPos(), *output);
+            MacroExpand(nullptr, callFrame, callText, m->GetIndent(), GetOutputPos(), *output);
         } else {
             basic_xstring value;
-            ReadVariableValueByParsingExpression(callFrame, BasicSubString(callText), m->GetReturnType(), value);
+            ReadVariableValueByParsingExpression(callFrame, callText, m->GetReturnType(), value);
             WriteCalculatedSubString(BasicSubString(value));
         }
     } catch (LexScannerException& e) {
-        // Errors in the call text itself would point into callText, which dies here: they move to the call.
-        const auto p = reinterpret_cast<std::uintptr_t>(e.GetPosition());
-        const auto callBegin = reinterpret_cast<std::uintptr_t>(callText.data());
-        if (p >= callBegin && p <= callBegin + callText.size()) e.SetPosition(currentToken.begin());
+        held.MovePositionOut(e);
         e.AppendCallContextLine(Compose("\n    invoking macro ", *m));
         throw;
     }

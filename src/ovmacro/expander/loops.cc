@@ -1,5 +1,6 @@
 // @for over a list or a list of tuples, and @while: expand a block once per item or while a condition holds.
 #include "ovmacro/expander/condition.h"
+#include "ovmacro/expander/held_text.h"
 #include "ovmacro/expander/macro_expander.h"
 #include "ovmacro/foundations/compose.h"
 #include "ovmacro/lexer/section_scanners.h"
@@ -47,11 +48,18 @@ void MacroExpander::ProcessForDirective() {
     const char* listPosition = cursor.begin();
     const BasicSubString listText = ScanBrackettedSection(cursor, false, TK_LPAREN, TK_RPAREN);
 
-    basic_xstring list;
+    // Items are views into the expanded list, and so are the bodies of the loop names: the list is a held
+    // text, which outlives the loop if its items define anything, and from which errors move to the source.
+    basic_xstring expanded;
+    OutputPieces pieces;
     {
         VarFrame child(frame);
-        MacroExpand(nullptr, &child, listText, 0, 0, list);
+        MacroExpand(nullptr, &child, listText, 0, 0, expanded, pieces);
     }
+    HeldTextKeeper keeper(frame);
+    const HeldText& held =
+        keeper.Hold(std::make_unique<HeldText>(" @for", std::move(expanded), std::move(pieces), listText));
+    const BasicSubString list = held.GetText();
     int64 indent = 0;
     BasicSubString block;
     try {
@@ -108,6 +116,7 @@ void MacroExpander::ProcessForDirective() {
         try {
             MacroExpand(nullptr, &iterationFrame, block, indent, blockOutputIndent, *output);
         } catch (LexScannerException& e) {
+            held.MovePositionOut(e);
             // A call-chain line: a block that invokes itself would otherwise add one line per level.
             e.AppendCallContextLine(Compose("\n    in @for directive when ", singleName, " = ", item));
             throw;

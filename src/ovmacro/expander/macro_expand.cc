@@ -1,4 +1,5 @@
 // The library's entry points: expand a text into an output, or into a string with or without its pieces.
+#include "ovmacro/expander/held_text.h"
 #include "ovmacro/expander/macro_expander.h"
 #include "ovmacro/expander/nesting_guard.h"
 
@@ -11,6 +12,9 @@ void MacroExpand(ImportHandler* importHandler, VarFrame* frame, BasicSubString t
         MacroExpander expander(importHandler, frame, text, inputIndent, outputIndent, output);
         expander.Expand();
     } catch (LexScannerException& e) {
+        // A position in a text that an expansion made (and that still lives) means nothing to a host: it
+        // moves to the source. At every level, since a host may report the errors of a nested expansion.
+        MovePositionOutOfHeldTexts(e);
         if (guard.IsOutermost()) e.AppendOmittedContextCount();
         throw;
     }
@@ -18,7 +22,8 @@ void MacroExpand(ImportHandler* importHandler, VarFrame* frame, BasicSubString t
 
 void MacroExpand(ImportHandler* importHandler, VarFrame* frame, BasicSubString text, int64 inputIndent,
                  int64 outputIndent, basic_xstring& result) {
-    StringStream stream;
+    // The expansion of a text is usually about as long as the text: reserve that much at once.
+    StringStream stream(static_cast<size_t>(text.size()) + 16);
     ExpandedOutput output(&stream);
     MacroExpand(importHandler, frame, text, inputIndent, outputIndent, output);
     stream.GetString(result, true);
@@ -26,7 +31,8 @@ void MacroExpand(ImportHandler* importHandler, VarFrame* frame, BasicSubString t
 
 void MacroExpand(ImportHandler* importHandler, VarFrame* frame, BasicSubString text, int64 inputIndent,
                  int64 outputIndent, basic_xstring& result, OutputPieces& pieces) {
-    StringStream stream;
+    // The expansion of a text is usually about as long as the text: reserve that much at once.
+    StringStream stream(static_cast<size_t>(text.size()) + 16);
     ExpandedOutput output(&stream);
     MacroExpand(importHandler, frame, text, inputIndent, outputIndent, output);
     stream.GetString(result, true);

@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <memory>
 
+#include "ovmacro/expander/held_text.h"
 #include "ovmacro/expander/macro_expander.h"
 #include "ovmacro/expr/expression_parser.h"
 #include "ovmacro/foundations/compose.h"
@@ -37,23 +38,6 @@ private:
     int64& ref_;
     int64 saved_;
 };
-
-// The newest variable of each frame from `frame` outward, to see afterwards whether a nested expansion added
-// definitions that outlive it.
-xvector<const LSVariable*> NewestVariables(VarFrame* frame) {
-    xvector<const LSVariable*> newest;
-    for (VarFrame* f = frame; f; f = f->GetParent()) newest.push_back(f->vars.First());
-    return newest;
-}
-
-// The outermost frame from `frame` outward whose newest variable is no longer the one recorded, or null.
-VarFrame* OutermostChangedFrame(VarFrame* frame, const xvector<const LSVariable*>& newest) {
-    VarFrame* changed = nullptr;
-    size_t i = 0;
-    for (VarFrame* f = frame; f && i < newest.size(); f = f->GetParent(), ++i)
-        if (f->vars.First() != newest[i]) changed = f;
-    return changed;
-}
 
 }  // namespace
 
@@ -163,14 +147,19 @@ void MacroExpander::ProcessRndBracketDirective() {
 void MacroExpander::ProcessSqrBracketDirective() {
     const BasicSubString section = ScanBrackettedSection(cursor, false, TK_LBRACKET, TK_RBRACKET);
     AdvanceWritePos(cursor.begin(), false);
-    // The text of the second pass is held by a variable, not a plain string: definitions that the second
-    // pass exports to an outer frame (@exportdef, @def +) keep views of this text as their names and bodies,
-    // so the text must live as long as the frame that received them. Its name " @[" can never be looked up
-    // (no identifier holds a blank), so the holder stays invisible there.
-    auto holder =
-        std::make_unique<LSVar>(BasicSubString(" @["), BasicSubString(ExpandInChildFrame(frame, section, 0)));
-    const BasicSubString first(holder->value);
-    const xvector<const LSVariable*> newest = NewestVariables(frame);
+    // The text of the second pass is a held text: definitions that it exports to an outer frame (@exportdef,
+    // @def +) keep views of it as their names and bodies, so it lives as long as the frame that received
+    // them, and an error in such a body later is placed at the source that produced the text.
+    basic_xstring expanded;
+    OutputPieces pieces;
+    {
+        VarFrame child(frame);
+        MacroExpand(nullptr, &child, section, 0, 0, expanded, pieces);
+    }
+    HeldTextKeeper keeper(frame);
+    const HeldText& held =
+        keeper.Hold(std::make_unique<HeldText>(" @[", std::move(expanded), std::move(pieces), section));
+    const BasicSubString first = held.GetText();
     basic_xstring second;
     try {
         VarFrame child(frame);
@@ -179,10 +168,8 @@ void MacroExpander::ProcessSqrBracketDirective() {
         StringFindAndReplace(e.GetMessage(), "EOS", "]");
         e.AppendToMessage(Compose("\n    in @[", first, "]"));
         e.SetPosition(currentToken.begin());
-        if (VarFrame* keeper = OutermostChangedFrame(frame, newest)) keeper->AddVariable(holder.release());
         throw;
     }
-    if (VarFrame* keeper = OutermostChangedFrame(frame, newest)) keeper->AddVariable(holder.release());
     WriteCalculatedSubString(BasicSubString(second));
 }
 
