@@ -5,6 +5,7 @@
 #include <system_error>
 #include <utility>
 
+#include "ovmacro/expander/held_text.h"
 #include "ovmacro/foundations/compose.h"
 #include "ovmacro/foundations/files.h"
 #include "ovmacro/foundations/paths.h"
@@ -105,6 +106,11 @@ bool FileHost::HandleImportPath(const basic_xstring& path, const char* position)
     return true;
 }
 
+void FileHost::ReportError(const LexScannerException& e) {
+    WriteDiagnostic(xcerr(), mpfwFrame->sourceFiles, e, diagnostics_);
+    xcerr().flush();
+}
+
 void FileHost::OnImport(MpfwSourceFile* file) {
     pendingImport_ = file;
 }
@@ -115,8 +121,7 @@ bool FileHost::PrintSettings(xostream& out) {
         for (int64 i = 0; i < files.size(); ++i) ReadSettingsOf(files[i], out);
     } catch (const LexScannerException& e) {
         out.flush();
-        files.WriteLexScannerError(xcerr(), e);
-        xcerr().flush();
+        ReportError(e);
         return false;
     }
     out.flush();
@@ -151,6 +156,8 @@ void FileHost::ReadSettingsOf(MpfwSourceFile* file, xostream& out) {
         if (e.GetPosition() == file->expandedText.data() + file->expandedText.size())
             e.SetPosition(file->text.data() + file->text.size());
         file->AdjustErrorPosition(e);
+        // Text made by a macro that a double expansion or a loop item defined maps into that made text.
+        MovePositionOutOfHeldTexts(e);
         throw;
     }
     reading_.pop_back();

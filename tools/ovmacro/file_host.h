@@ -2,8 +2,8 @@
 //
 // A project description parser whose imports are files on disk: @import "name" looks for name beside the
 // importing file, then in each -I directory, then in each @importpath directory, all in the one file-scope
-// frame, so that what an imported file defines is visible after its @import. Errors are reported by the
-// library, with the file and line they belong to.
+// frame, so that what an imported file defines is visible after its @import. Errors are reported on
+// standard error, with the file and line they belong to, in the default or the gnu form.
 //
 //     orvan::MpfwSourceFileList files;
 //     orvan::MpfwFrame frame(files);
@@ -17,6 +17,7 @@
 #include <string>
 #include <vector>
 
+#include "diagnostics.h"
 #include "ovmacro/mpfw/mpfw_parser.h"
 
 namespace ovmacro_tool {
@@ -52,6 +53,9 @@ public:
     void OnImport(orvan::MpfwSourceFile* file) override;
     // A relative @importpath directory is taken relative to the file that gives it.
     bool HandleImportPath(const orvan::basic_xstring& path, const char* position) override;
+    // Writes the report of an error on standard error, in the form chosen with SetDiagnosticStyle.
+    void ReportError(const orvan::LexScannerException& e) override;
+    void SetDiagnosticStyle(DiagnosticStyle style) { diagnostics_ = style; }
 
 private:
     // The directory of the file whose import is being handled or read; empty for the working directory.
@@ -69,6 +73,7 @@ private:
     std::set<std::string> read_;
     orvan::MpfwSourceFile* pendingImport_ = nullptr;
     orvan::MpfwSourceFile* lastLoaded_ = nullptr;
+    DiagnosticStyle diagnostics_ = DiagnosticStyle::kDefault;
 };
 
 }  // namespace ovmacro_tool

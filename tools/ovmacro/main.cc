@@ -6,14 +6,21 @@
 #include <utility>
 #include <vector>
 
+#include "check_mode.h"
 #include "file_host.h"
+#include "line_markers.h"
 #include "options.h"
+#include "output_runs.h"
 #include "ovmacro/foundations/files.h"
 #include "ovmacro/python/python_bridge.h"
+#include "source_locator.h"
+#include "source_map.h"
 
 using namespace orvan;
 using ovmacro_tool::FileHost;
 using ovmacro_tool::Options;
+using ovmacro_tool::OutputRun;
+using ovmacro_tool::SourceLocator;
 
 namespace {
 
@@ -95,6 +102,7 @@ int main(int argc, char** argv) {
     MpfwSourceFileList files;
     MpfwFrame frame(files);
     FileHost host(frame, options.includeDirs);
+    host.SetDiagnosticStyle(options.diagnostics);
 
     if (!options.defines.empty() &&
         host.LoadText("<command line>", DefinitionsText(options)) != FileHost::Load::kOk)
@@ -120,20 +128,42 @@ int main(int argc, char** argv) {
 
     if (options.settings && !host.PrintSettings(xcout())) return kExitExpansionError;
 
-    const std::string& result = host.LastLoaded()->expandedText;
+    const MpfwSourceFile* root = host.LastLoaded();
+    // The expansion is written as it stands; only line markers need a copy to write into.
+    std::string marked;
+    const std::string* result = &root->expandedText;
+    std::string sourceMap;
+    if (options.lineMarkers || !options.sourceMapPath.empty()) {
+        const SourceLocator locator(files);
+        std::vector<OutputRun> runs = ovmacro_tool::SplitIntoRuns(*result, root->pieces, locator);
+        if (options.lineMarkers) {
+            marked = *result;
+            ovmacro_tool::AddLineMarkers(marked, runs, locator);
+            result = &marked;
+        }
+        if (!options.sourceMapPath.empty())
+            sourceMap = ovmacro_tool::SourceMapJson(options.outputPath.empty() ? "-" : options.outputPath,
+                                                    runs, *result, locator);
+    }
+    if (options.check) return ovmacro_tool::CheckGeneratedFile(options.outputPath, *result);
+
     if (options.outputPath.empty()) {
-        if (!options.settings && (std::fwrite(result.data(), 1, result.size(), stdout) != result.size() ||
+        if (!options.settings && (std::fwrite(result->data(), 1, result->size(), stdout) != result->size() ||
                                   std::fflush(stdout) != 0)) {
             std::fprintf(stderr, "ovmacro: cannot write standard output\n");
             return kExitUsage;
         }
-    } else if (!WriteFileAtomically(options.outputPath, result, error)) {
+    } else if (!WriteFileAtomically(options.outputPath, *result, error)) {
         std::fprintf(stderr, "ovmacro: cannot write %s: %s\n", options.outputPath.c_str(), error.c_str());
         return kExitUsage;
     }
     if (!options.depsPath.empty() &&
         !WriteFileAtomically(options.depsPath, DependencyText(options, host), error)) {
         std::fprintf(stderr, "ovmacro: cannot write %s: %s\n", options.depsPath.c_str(), error.c_str());
+        return kExitUsage;
+    }
+    if (!options.sourceMapPath.empty() && !WriteFileAtomically(options.sourceMapPath, sourceMap, error)) {
+        std::fprintf(stderr, "ovmacro: cannot write %s: %s\n", options.sourceMapPath.c_str(), error.c_str());
         return kExitUsage;
     }
     return 0;

@@ -35,31 +35,66 @@ bool ParseDefine(const std::string& arg, Options& options, std::string& error) {
 
 const char* UsageText() {
     return "Usage: ovmacro [OPTIONS] [FILE]\n"
-           "Expands the macros of FILE (standard input when FILE is - or absent) and writes the expansion "
-           "to\n"
-           "standard output. Files that FILE imports with @import \"NAME\" are expanded in the same scope, "
-           "so that\n"
-           "their definitions are visible after the @import, which stays in the output.\n"
+           "Expands the macros of FILE (standard input when FILE is - or absent) and writes the\n"
+           "expansion to standard output. Files that FILE imports with @import \"NAME\" are expanded\n"
+           "in the same scope, so that their definitions are visible after the @import, which\n"
+           "stays in the output.\n"
            "\n"
            "Options:\n"
            "  -o OUT         write the expansion to OUT instead (only when the expansion succeeds)\n"
            "  -D NAME=TEXT   define macro NAME with body TEXT before FILE is expanded, as a line\n"
-           "                 \"@def NAME = TEXT\" at the top of FILE would; -D NAME defines NAME as true\n"
-           "  -I DIR         search imported files in DIR; an imported NAME is looked for beside the\n"
-           "                 importing file, then in each -I DIR in order, then in each @importpath "
-           "directory\n"
-           "  --settings     after expanding, read the settings of FILE and its imports and print each\n"
-           "                 dollar definition ($NAME = value) as NAME=VALUE; the expansion goes only to -o "
-           "OUT\n"
+           "                 \"@def NAME = TEXT\" at the top of FILE would; -D NAME defines NAME as\n"
+           "                 true\n"
+           "  -I DIR         search imported files in DIR; an imported NAME is looked for beside\n"
+           "                 the importing file, then in each -I DIR in order, then in each\n"
+           "                 @importpath directory\n"
+           "  --settings     after expanding, read the settings of FILE and its imports and print\n"
+           "                 each dollar definition ($NAME = value) as NAME=VALUE; the expansion\n"
+           "                 goes only to -o OUT\n"
            "  --no-python    refuse embedded Python code (@runpython, @defpython macros fail)\n"
-           "  --deps DEPFILE also write a Make dependency file: \"TARGET: FILE IMPORTED...\" (TARGET is "
-           "OUT,\n"
-           "                 else FILE) and an empty rule for each imported file\n"
+           "  --deps DEPFILE also write a Make dependency file: \"TARGET: FILE IMPORTED...\" (TARGET\n"
+           "                 is OUT, else FILE) and an empty rule for each imported file\n"
+           "  --source-map MAPFILE\n"
+           "                 also write a JSON source map of the expansion: for each run of output\n"
+           "                 (never more than one line), the file, line and column it was copied\n"
+           "                 from or that produced it (see below)\n"
+           "  --line-markers write a line #line N \"FILE\" before each output line whose template\n"
+           "                 line is not the one a C or C++ compiler would count on, so that its\n"
+           "                 errors in the generated code name the template line (see below)\n"
+           "  --diagnostics=STYLE\n"
+           "                 the form of error reports: default (FILE(LINE) : MESSAGE) or gnu\n"
+           "                 (FILE:LINE:COLUMN: error: MESSAGE, the source line, a caret under the\n"
+           "                 column, then the other lines of the message), which editors and CI\n"
+           "                 annotators read\n"
+           "  --check        with -o OUT: expand and compare with the existing OUT instead of\n"
+           "                 writing it; exit 0 when equal, 1 with a short unified diff when\n"
+           "                 different or when OUT is missing; writes no file, so --deps and\n"
+           "                 --source-map cannot be used with it\n"
            "  --help         show this text and exit\n"
            "  --version      show the version and exit\n"
            "\n"
-           "Exit status: 0 on success, 1 when the expansion or the settings fail (the error is reported on\n"
-           "standard error as FILE(LINE) : MESSAGE), 2 on a usage error or an unreadable FILE.\n";
+           "Lines and columns count from 1; a column counts bytes, so a tab counts 1.\n"
+           "\n"
+           "Source map: a JSON object {\"version\": 1, \"output\": OUT or \"-\", \"files\": [the loaded\n"
+           "files, in load order], \"mappings\": [...]}, each mapping an object with \"offset\",\n"
+           "\"length\", \"line\", \"column\", \"kind\" and, when the run has a source, \"file\",\n"
+           "\"sourceLine\", \"sourceColumn\" (and \"sourceLength\" for calculated runs). The mappings\n"
+           "tile the output in order; offset and length count bytes of the output, line and column\n"
+           "are where the run starts in it. kind is \"copied\" (the run is the text at file (an\n"
+           "index into files), sourceLine, sourceColumn), \"calculated\" (text that the sourceLength\n"
+           "bytes there produced: a macro value, a @str result...), \"indent\" (blanks that indent a\n"
+           "nested text) or \"marker\" (a #line line).\n"
+           "\n"
+           "Line markers: the template line of an output line is that of its first character,\n"
+           "other than a blank or tab, that comes from a loaded file; lines without one (blank\n"
+           "lines) never get a marker. A marker is written when the template file or line differs\n"
+           "from the one the compiler presumes (that of the last marker plus the output lines\n"
+           "since), but never after a line ending in a backslash, in a /* */ comment or in a raw\n"
+           "string literal.\n"
+           "\n"
+           "Exit status: 0 on success, 1 when the expansion or the settings fail (the error is\n"
+           "reported on standard error) or --check finds OUT different or missing, 2 on a usage\n"
+           "error or an unreadable FILE or OUT.\n";
 }
 
 bool ParseOptions(int argc, char** argv, Options& options, std::string& error) {
@@ -91,6 +126,29 @@ bool ParseOptions(int argc, char** argv, Options& options, std::string& error) {
             options.settings = true;
         } else if (arg == "--no-python") {
             options.noPython = true;
+        } else if (arg == "--line-markers") {
+            options.lineMarkers = true;
+        } else if (arg == "--check") {
+            options.check = true;
+        } else if (arg == "--source-map" || arg.substr(0, 13) == "--source-map=") {
+            if (arg.size() > 12)
+                options.sourceMapPath = std::string(arg.substr(13));
+            else if (!value(options.sourceMapPath))
+                return false;
+            // "-" would be a file of that name, not standard output, which holds the expansion.
+            if (options.sourceMapPath.empty() || options.sourceMapPath == "-") {
+                error = "--source-map needs a file name";
+                return false;
+            }
+        } else if (arg == "--diagnostics" || arg.substr(0, 14) == "--diagnostics=") {
+            if (arg.size() > 13)
+                text = std::string(arg.substr(14));
+            else if (!value(text))
+                return false;
+            if (!ParseDiagnosticStyle(text, options.diagnostics)) {
+                error = "unknown diagnostics style '" + text + "' (expected default or gnu)";
+                return false;
+            }
         } else if (arg == "--deps") {
             if (!value(options.depsPath)) return false;
         } else if (arg.substr(0, 7) == "--deps=") {
@@ -120,6 +178,18 @@ bool ParseOptions(int argc, char** argv, Options& options, std::string& error) {
     }
     if (!options.depsPath.empty() && options.inputPath == "-" && options.outputPath.empty()) {
         error = "--deps needs -o OUT when the input is standard input";
+        return false;
+    }
+    if (options.check && options.outputPath.empty()) {
+        error = "--check needs -o OUT, the file to compare with";
+        return false;
+    }
+    if (options.check && (!options.depsPath.empty() || !options.sourceMapPath.empty())) {
+        error = "--check writes no file: it cannot be used with --deps or --source-map";
+        return false;
+    }
+    if (!options.sourceMapPath.empty() && options.settings && options.outputPath.empty()) {
+        error = "--source-map with --settings needs -o OUT, where the expansion goes";
         return false;
     }
     return true;

@@ -5,16 +5,22 @@
 #include <utility>
 #include <vector>
 
+#include "diagnostics.h"
+
 namespace ovmacro_tool {
 
 struct Options {
     std::string inputPath = "-";  // "-" is standard input
     std::string outputPath;       // empty: standard output
     std::string depsPath;         // --deps: where the Make dependency file goes; empty: none
+    std::string sourceMapPath;    // --source-map: where the JSON source map goes; empty: none
     std::vector<std::pair<std::string, std::string>> defines;  // -D NAME=TEXT, in order
     std::vector<std::string> includeDirs;                      // -I DIR, in order
-    bool settings = false;  // --settings: print the settings instead of the expansion
-    bool noPython = false;  // --no-python: refuse embedded Python code
+    bool settings = false;     // --settings: print the settings instead of the expansion
+    bool noPython = false;     // --no-python: refuse embedded Python code
+    bool lineMarkers = false;  // --line-markers: write #line markers into the expansion
+    bool check = false;        // --check: compare the expansion with OUT instead of writing it
+    DiagnosticStyle diagnostics = DiagnosticStyle::kDefault;  // --diagnostics: the form of error reports
     bool help = false;
     bool version = false;
 };

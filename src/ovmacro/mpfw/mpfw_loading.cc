@@ -54,11 +54,15 @@ MpfwSourceFile* MpfwParser::AddFileWithText(const basic_xstring& name, basic_xst
         // An imported file's expansion is not the outermost one, which would otherwise count the context
         // lines left out; the report is written here, so count them here.
         e.AppendOmittedContextCount();
-        TracerX trace;
-        mpfwFrame->sourceFiles.WriteLexScannerError(trace, e);
+        ReportError(e);
         return nullptr;
     }
     return file;
+}
+
+void MpfwParser::ReportError(const LexScannerException& e) {
+    TracerX trace;
+    mpfwFrame->sourceFiles.WriteLexScannerError(trace, e);
 }
 
 bool MpfwParser::HandleImportPath(const basic_xstring& path, const char* position) {

@@ -37,8 +37,9 @@ public:
     // Loading.
 
     // Reads the file (CR LF read as LF), appends `extra`, records it and expands it. A file that cannot be
-    // read raises "Couldn't open file " + path at the current token. An expansion error is written as a
-    // report (file and line) to standard error; the file stays recorded and the result is null.
+    // read raises "Couldn't open file " + path at the current token. An expansion error is handed to
+    // ReportError (by default a report with file and line on standard error); the file stays recorded and
+    // the result is null.
     MpfwSourceFile* AddFile(const basic_xstring& path, BasicSubString extra);
     // The same for a text that the host already holds (standard input, text made by the host), recorded
     // under `name`.
@@ -57,6 +58,10 @@ public:
     virtual bool ResolveFile(const basic_xstring& name, basic_xstring& fullPath) = 0;
     // Tells the host that the text being read imports `file` (the recorded file of that path, or null).
     virtual void OnImport(MpfwSourceFile* file) = 0;
+    // Writes the report of an expansion error that AddFile does not pass on. By default the report
+    // "\nFILE(LINE) : MESSAGE\n" of the source-file list goes to standard error; a host may write it
+    // elsewhere or in another form.
+    virtual void ReportError(const LexScannerException& e);
 
     // Replaces the references to defined dollar macros in text, repeatedly; true if anything was replaced.
     bool ApplyMacros(basic_xstring& text);
