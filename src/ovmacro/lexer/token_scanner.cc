@@ -73,8 +73,11 @@ LSToken LsScanToken(BasicSubString& s, bool returnComments) {
 EToken LsScanTokenHelper(BasicSubString& s) {
     const char c = s.front();
     if (IsDigit(c)) return LsScanNumber(s);
-    if (LsScanLiteralString(s, '\'', "single quoted string")) return TK_SQ_STRING;
-    if (LsScanLiteralString(s, '"', "double quoted string")) return TK_DQ_STRING;
+    // Only a quote, or r or R, can begin a literal: other characters skip both attempts.
+    if (c == '\'' || c == '"' || c == 'r' || c == 'R') {
+        if (LsScanLiteralString(s, '\'', "single quoted string")) return TK_SQ_STRING;
+        if (LsScanLiteralString(s, '"', "double quoted string")) return TK_DQ_STRING;
+    }
     if (ScanIdentifier(s)) return TK_IDENTIFIER;
     if (LsScanComment(s)) return TK_COMMENT;
     if (c == '@' && s.size() >= 2) {

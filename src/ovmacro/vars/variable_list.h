@@ -1,5 +1,6 @@
 // LSVariableList: the variables of one scope. It owns them (a chain from newest to oldest, hidden ones
-// included) and indexes the newest of each name for lookup by view, without building strings.
+// included) and finds the newest of each name by view, without building strings: along the chain while the
+// list is small, through an ordered index once it has grown.
 #pragma once
 
 #include <map>
@@ -24,7 +25,12 @@ public:
     LSVariable* First() const { return first_; }
 
 private:
+    // Small lists (the bindings of one invocation, one loop iteration) are searched along the chain, which
+    // needs no allocation; the index is built once a list grows past this many variables.
+    static constexpr int64 kIndexThreshold = 12;
+
     LSVariable* first_ = nullptr;
+    int64 count_ = 0;
     std::map<BasicSubString, LSVariable*, SubStringLess> byName_;
 };
 

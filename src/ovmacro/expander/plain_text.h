@@ -1,0 +1,20 @@
+// The fast lane of the expander's main loop: skips ordinary text that needs nothing but copying.
+#pragma once
+
+#include "ovmacro/foundations/sub_string.h"
+
+namespace orvan {
+
+struct PlainTextRun {
+    const char* stop;         // where something needs the main loop: a token start, or the end of the text
+    const char* ordinaryEnd;  // the end of the last token or line feed skipped: the blanks after it stay pending
+};
+
+// Skips, from a token boundary, the tokens that the main loop would copy unchanged: blanks, line feeds (unless
+// `lineFeedsNeedWork`, when indentation must be removed), punctuation and operators, numbers, comments,
+// single-quoted literals, double-quoted literals (unless `dollarMacrosActive`), and identifiers that have never
+// named a variable. It stops at the start of any other token; scanning errors are raised exactly as the token
+// scanner raises them, at the same positions.
+PlainTextRun SkipPlainText(const char* p, const char* end, bool lineFeedsNeedWork, bool dollarMacrosActive);
+
+}  // namespace orvan
