@@ -2,7 +2,7 @@
 # Installs the Debian packages the project needs, if any is missing (Debian 12). Needs root or sudo.
 set -euo pipefail
 
-packages=(cmake make g++ libgtest-dev libbenchmark-dev libpython3-dev)
+packages=(cmake make g++ libgtest-dev libbenchmark-dev libpython3-dev pkg-config m4)
 missing=()
 for p in "${packages[@]}"; do
   dpkg-query -W -f='${Status}' "$p" 2>/dev/null | grep -q 'install ok installed' || missing+=("$p")

@@ -10,6 +10,7 @@ echo "== normal build"
 cmake -S . -B build/test -DCMAKE_BUILD_TYPE=RelWithDebInfo
 cmake --build build/test -j"$jobs"
 ctest --test-dir build/test --output-on-failure -j"$jobs"
+scripts/check-install.sh build/test  # the installed package, as a consumer builds against it
 
 echo "== AddressSanitizer + UndefinedBehaviorSanitizer build"
 cmake -S . -B build/sanitize -DCMAKE_BUILD_TYPE=Debug -DOVMACRO_SANITIZE=ON -DOVMACRO_BUILD_BENCHMARKS=OFF

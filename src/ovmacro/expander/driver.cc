@@ -1,5 +1,7 @@
 // The main loop of the expander: copies ordinary text, finds macro names and dispatches @-directives.
 #include "ovmacro/expander/macro_expander.h"
+#include "ovmacro/expander/nesting_guard.h"
+#include "ovmacro/expander/plain_text.h"
 #include "ovmacro/foundations/scanning.h"
 #include "ovmacro/lexer/token_scanner.h"
 
@@ -21,14 +23,20 @@ void MacroExpander::AdvanceWritePos(const char* p, bool write) {
     writePos = p;
 }
 
-void MacroExpander::WriteSubStringFromSourceFile(BasicSubString s) { output->WriteSubStringFromSourceFile(s, outputIndent); }
-
-void MacroExpander::WriteCalculatedSubString(BasicSubString s) {
-    output->WriteCalculatedSubString(s, currentToken, outputIndent);
+// Every write is counted against the work bound of the outermost expansion (none unless a fuzzer or a test
+// set one), inserted indentation included.
+void MacroExpander::WriteSubStringFromSourceFile(BasicSubString s) {
+    const int64 before = output->GetCharCount();
+    output->WriteSubStringFromSourceFile(s, outputIndent);
+    MacroNestingGuard::ChargeOutput(output->GetCharCount() - before, s.begin());
 }
 
+void MacroExpander::WriteCalculatedSubString(BasicSubString s) { WriteCalculatedSubString(s, currentToken); }
+
 void MacroExpander::WriteCalculatedSubString(BasicSubString s, BasicSubString source) {
+    const int64 before = output->GetCharCount();
     output->WriteCalculatedSubString(s, source, outputIndent);
+    MacroNestingGuard::ChargeOutput(output->GetCharCount() - before, source.begin());
 }
 
 LSToken MacroExpander::ReadToken() { return LsScanToken(cursor, false); }
@@ -63,6 +71,14 @@ void MacroExpander::Expand() {
         if (ordinaryEnd > writePos) AdvanceWritePos(ordinaryEnd, true);
     };
     for (;;) {
+        // Most text needs nothing but copying: skip it in one go, up to the next token that needs a look.
+        const FileScopeVarFrame* fileScope = frame->GetFileScopeVarFrame();
+        const bool dollarMacrosActive =
+            fileScope && (!fileScope->dollarMacros.empty() || !fileScope->importedFiles.empty());
+        const PlainTextRun run = SkipPlainText(cursor.begin(), cursor.end(), inputIndent > 0, dollarMacrosActive);
+        cursor.SetBegin(run.stop);
+        ordinaryEnd = run.ordinaryEnd;
+
         // Blanks stay pending; a line feed ends a line, and the next line's indentation is removed.
         while (!cursor.empty()) {
             const char c = cursor.front();

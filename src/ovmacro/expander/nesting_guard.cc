@@ -13,6 +13,11 @@ thread_local int64 t_depth = 0;
 thread_local int64 t_depthLimit = 0;
 thread_local const char* t_stackLow = nullptr;  // the lowest usable address of this thread's stack
 thread_local bool t_stackKnown = false;
+// The work bounds (kNoWorkLimit: none) and what the thread's outermost expansion has used of them.
+thread_local int64 t_expansionLimit = kNoWorkLimit;
+thread_local int64 t_outputLimit = kNoWorkLimit;
+thread_local int64 t_expansions = 0;
+thread_local int64 t_outputChars = 0;
 
 // The low end of the calling thread's stack (stacks grow down on x86-64), or null when it cannot be told.
 const char* StackLowEnd() {
@@ -48,11 +53,34 @@ MacroNestingGuard::MacroNestingGuard(const char* position) : outermost_(t_depth 
         throw LexScannerException(
             Compose("Macro expansion nested too deeply (", t_depth, " levels exhaust the stack): is a macro invoking itself?"),
             position);
+    if (outermost_) {
+        t_expansions = 0;
+        t_outputChars = 0;
+    }
+    // Counted before the check, so that once the bound is passed every later expansion fails too, also after
+    // an @assertfails has swallowed the first failure.
+    if (t_expansionLimit != kNoWorkLimit && ++t_expansions > t_expansionLimit)
+        throw LexScannerException(
+            Compose("Expansion work limit reached (more than ", t_expansionLimit, " expansions)"), position);
     ++t_depth;
 }
 
 MacroNestingGuard::~MacroNestingGuard() { --t_depth; }
 
 void MacroNestingGuard::SetDepthLimitForTesting(int64 limit) { t_depthLimit = limit; }
+
+void MacroNestingGuard::SetWorkLimitsForTesting(int64 expansions, int64 outputChars) {
+    t_expansionLimit = expansions;
+    t_outputLimit = outputChars;
+}
+
+void MacroNestingGuard::ChargeOutput(int64 chars, const char* position) {
+    if (t_outputLimit == kNoWorkLimit) return;
+    t_outputChars += chars;
+    if (t_outputChars > t_outputLimit)
+        throw LexScannerException(
+            Compose("Expansion work limit reached (more than ", t_outputLimit, " characters of output)"),
+            position);
+}
 
 }  // namespace orvan

@@ -126,18 +126,22 @@ void FileScopeVarFrame::InsertDollarMacro(const basic_xstring& name, const basic
 }
 
 const basic_xstring* FileScopeVarFrame::FindDollarMacro(const basic_xstring& name) const {
-    xvector<const FileScopeVarFrame*> visiting;
-    return FindDollarMacroGuarded(name, visiting);
+    xvector<const FileScopeVarFrame*> searched;
+    return FindDollarMacroGuarded(name, searched);
 }
 
+// A frame is searched once per lookup: a file imported again, directly or through others, answers nothing
+// new the second time (it found nothing the first time, or the lookup would have ended), and searching it again
+// would make a chain of files that import the next one twice cost two to the power of its length. A frame met
+// again on the current path, an import cycle, is skipped the same way.
 const basic_xstring* FileScopeVarFrame::FindDollarMacroGuarded(const basic_xstring& name,
-                                                               xvector<const FileScopeVarFrame*>& visiting) const {
+                                                               xvector<const FileScopeVarFrame*>& searched) const {
     auto it = dollarMacros.find(name);
     if (it != dollarMacros.end()) return &it->second;
-    if (Contains(visiting, static_cast<const FileScopeVarFrame*>(this))) return nullptr;  // an import cycle
-    VisitGuard<const FileScopeVarFrame*> guard(visiting, this);
+    if (Contains(searched, static_cast<const FileScopeVarFrame*>(this))) return nullptr;
+    searched.push_back(this);
     for (const FileScopeVarFrame* f : importedFiles)
-        if (const basic_xstring* v = f->FindDollarMacroGuarded(name, visiting)) return v;
+        if (const basic_xstring* v = f->FindDollarMacroGuarded(name, searched)) return v;
     return nullptr;
 }
 

@@ -86,7 +86,7 @@ public:
 
 private:
     const basic_xstring* FindDollarMacroGuarded(const basic_xstring& name,
-                                                xvector<const FileScopeVarFrame*>& visiting) const;
+                                                xvector<const FileScopeVarFrame*>& searched) const;
     bool ApplyDollarMacrosOnePass(xostream& os, BasicSubString text, basic_xstring* lastReplaced) const;
 };
 

@@ -1,0 +1,175 @@
+#!/usr/bin/env bash
+# Runs ovmacro and GNU m4 side by side on the same work and reports, for each workload, the median wall time,
+# the throughput, the peak resident memory and the ratio ovmacro/m4, all measured in this one run.
+#
+# Needs: GNU m4 and /usr/bin/time (scripts/install-deps.sh installs m4; this script installs nothing). It
+# builds ovmacro in Release into build/bench and writes its inputs and outputs into a temporary directory,
+# removed at the end. Usage: bench/compare_with_m4.sh   (RUNS=N sets the timed runs per tool, default 5)
+#
+# Workloads (the two tools must produce byte-identical outputs, which is checked):
+#   plain text    40 MB of words, digits and punctuation without directives, which both tools copy unchanged
+#                 (m4 runs with -P, so its builtins are m4_ prefixed, and the text avoids its quote
+#                 characters and comment character);
+#   macro calls   500,000 lines "x greet(aN, b) y" after a two-argument definition:
+#                 ovmacro  @def greet(a, b) = {Hello a and b!}
+#                 m4       m4_define(`greet', `Hello $1 and $2!')
+#   loop          one loop of 100,000 iterations writing "item N": ovmacro @for over a literal list of
+#                 100,000 items; m4 a recursive counting loop (m4_define/m4_ifelse/m4_incr), linear in GNU m4,
+#                 where a recursive foreach over a literal list would re-copy the rest of the list at every
+#                 step and take quadratic time;
+#   conditionals  200,000 loop-free lines: per group of four, a bool variable set, an int counter advanced,
+#                 a conditional on the bool that writes a string variable and the counter, and a plain line.
+#                 ovmacro uses @let and @if(flag){...}@else{...}; m4 uses m4_define, m4_incr and m4_ifelse.
+# Each tool runs RUNS times, alternating with the other (after one untimed run each), with output to a file.
+set -euo pipefail
+cd "$(dirname "$0")/.."
+runs=${RUNS:-5}
+
+for tool in m4 /usr/bin/time; do
+  command -v "$tool" >/dev/null || { echo "compare_with_m4: $tool is needed (scripts/install-deps.sh)" >&2; exit 2; }
+done
+
+echo "== building ovmacro (Release, build/bench)"
+cmake -S . -B build/bench -DCMAKE_BUILD_TYPE=Release -DOVMACRO_BUILD_TESTS=OFF -DOVMACRO_BUILD_BENCHMARKS=OFF \
+  >/dev/null
+cmake --build build/bench -j"$(nproc)" --target ovmacro >/dev/null
+ovmacro=$PWD/build/bench/tools/ovmacro/ovmacro
+
+work=$(mktemp -d "${TMPDIR:-/tmp}/ovmacro-vs-m4.XXXXXX")
+trap 'rm -rf "$work"' EXIT
+
+echo "== generating inputs in $work"
+# Plain text: deterministic pseudo-random lines of about 70 characters.
+awk -v target=40000000 'BEGIN {
+  n = split("lorem ipsum dolor sit amet consectetur adipiscing elit sed do eiusmod tempor incididunt ut " \
+            "labore et dolore magna aliqua enim ad minim veniam quis nostrud exercitation ullamco laboris " \
+            "nisi aliquip ex ea commodo consequat Duis aute irure in reprehenderit voluptate velit esse " \
+            "cillum fugiat nulla pariatur Excepteur sint occaecat cupidatat non proident sunt culpa qui " \
+            "officia deserunt mollit anim id est laborum", words, " ")
+  split(". , ; : ! ? -", marks, " ")
+  seed = 12345; size = 0; line = ""
+  while (size < target) {
+    seed = (seed * 1103515245 + 12345) % 2147483648
+    r = int(seed / 65536)
+    if (r % 11 == 0) word = r % 1000
+    else if (r % 13 == 0) word = words[r % n + 1] marks[r % 7 + 1]
+    else word = words[r % n + 1]
+    line = line == "" ? word : line " " word
+    if (length(line) > 64) { print line; size += length(line) + 1; line = "" }
+  }
+}' >"$work/plain.ovm"
+cp "$work/plain.ovm" "$work/plain.m4"
+plain_bytes=$(stat -c %s "$work/plain.ovm")
+
+calls=500000
+{
+  echo '@def greet(a, b) = {Hello a and b!}'
+  seq "$calls" | sed 's/.*/x greet(a&, b) y/'
+} >"$work/calls.ovm"
+{
+  cat <<'EOF'
+m4_define(`greet', `Hello $1 and $2!')m4_dnl
+EOF
+  seq "$calls" | sed 's/.*/x greet(a&, b) y/'
+} >"$work/calls.m4"
+
+items=100000
+{
+  echo 'before'
+  printf '@for(x in ['
+  seq -s ', ' "$items" | tr -d '\n'
+  printf ']){\nitem x\n}\n'
+  echo 'after'
+} >"$work/loop.ovm"
+# forloop(NAME, FIRST, LAST, TEXT): TEXT once for each value of NAME from FIRST to LAST. The recursive call
+# ends the expansion of each step, so m4 runs it in constant space.
+sed "s/@ITEMS@/$items/" >"$work/loop.m4" <<'EOF'
+m4_define(`forloop', `m4_pushdef(`$1', `$2')_forloop($@)m4_popdef(`$1')')m4_dnl
+m4_define(`_forloop', `$4`'m4_ifelse($1, `$3', `', `m4_define(`$1', m4_incr($1))$0($@)')')m4_dnl
+before
+forloop(`x', `1', `@ITEMS@', `item x
+')
+after
+EOF
+
+lines=200000
+groups=$((lines / 4))
+awk -v groups="$groups" 'BEGIN {
+  print "@let bool flag = false"; print "@let int n = 0"; print "@let string label := alpha"
+  for (i = 1; i <= groups; i++) {
+    print "@let flag = " (i % 3 == 0 ? "false" : "true")
+    print "@let n = n + 1"
+    print "@if(flag){label on n}@else{label off n}"
+    print "plain text of group " i
+  }
+}' >"$work/cond.ovm"
+awk -v groups="$groups" -v q="'" 'BEGIN {
+  print "m4_define(`flag" q ", `false" q ")m4_dnl"; print "m4_define(`n" q ", `0" q ")m4_dnl"
+  print "m4_define(`label" q ", `alpha" q ")m4_dnl"
+  for (i = 1; i <= groups; i++) {
+    print "m4_define(`flag" q ", `" (i % 3 == 0 ? "false" : "true") q ")m4_dnl"
+    print "m4_define(`n" q ", m4_incr(n))m4_dnl"
+    print "m4_ifelse(flag, `true" q ", `label on n" q ", `label off n" q ")"
+    print "plain text of group " i
+  }
+}' >"$work/cond.m4"
+
+# run OUTPUT_FILE COMMAND...: runs once with output to the file; sets wall (seconds) and rss (KB).
+run() {
+  local out=$1
+  shift
+  local start end
+  start=$(date +%s%N)
+  /usr/bin/time -f '%e %M' -o "$work/time" "$@" >"$out" || {
+    echo "compare_with_m4: failed: $*" >&2
+    exit 1
+  }
+  end=$(date +%s%N)
+  wall=$(awk -v ns=$((end - start)) 'BEGIN { printf "%.4f", ns / 1e9 }')
+  rss=$(awk 'END { print $2 }' "$work/time")
+}
+
+median() { sort -g | awk '{ v[NR] = $1 } END { print (NR % 2) ? v[(NR + 1) / 2] : (v[NR / 2] + v[NR / 2 + 1]) / 2 }'; }
+
+printf '\n%-13s %-8s %10s %18s %14s\n' workload tool 'median s' throughput 'peak RSS MB'
+# bench NAME LABEL UNITS UNIT: times $work/NAME.ovm (ovmacro) against $work/NAME.m4 (m4 -P); the throughput
+# is UNITS per second (UNIT "MB": bytes, shown as MB/s).
+bench() {
+  local name=$1 label=$2 units=$3 unit=$4 i
+  local -a ov_wall=() m4_wall=() ov_rss=() m4_rss=()
+  run "$work/$name.ovmacro.out" "$ovmacro" "$work/$name.ovm"
+  run "$work/$name.m4.out" m4 -P "$work/$name.m4"
+  cmp -s "$work/$name.ovmacro.out" "$work/$name.m4.out" || {
+    echo "compare_with_m4: $name: the outputs of ovmacro and m4 differ" >&2
+    diff "$work/$name.ovmacro.out" "$work/$name.m4.out" | head -n 10 >&2
+    exit 1
+  }
+  for ((i = 0; i < runs; i++)); do
+    run "$work/$name.ovmacro.out" "$ovmacro" "$work/$name.ovm"
+    ov_wall+=("$wall") ov_rss+=("$rss")
+    run "$work/$name.m4.out" m4 -P "$work/$name.m4"
+    m4_wall+=("$wall") m4_rss+=("$rss")
+  done
+  local ovw m4w ovr m4r
+  ovw=$(printf '%s\n' "${ov_wall[@]}" | median)
+  m4w=$(printf '%s\n' "${m4_wall[@]}" | median)
+  ovr=$(printf '%s\n' "${ov_rss[@]}" | sort -n | tail -n 1)
+  m4r=$(printf '%s\n' "${m4_rss[@]}" | sort -n | tail -n 1)
+  awk -v name="$label" -v units="$units" -v unit="$unit" -v ovw="$ovw" -v m4w="$m4w" -v ovr="$ovr" -v m4r="$m4r" '
+    function rate(t) { return unit == "MB" ? sprintf("%.1f MB/s", units / 1e6 / t) : sprintf("%.0f %s/s", units / t, unit) }
+    BEGIN {
+      printf "%-13s %-8s %10.3f %18s %14.1f\n", name, "ovmacro", ovw, rate(ovw), ovr / 1024
+      printf "%-13s %-8s %10.3f %18s %14.1f\n", "", "m4", m4w, rate(m4w), m4r / 1024
+      printf "%-13s %-8s %10s %18s %14s\n", "", "ratio", sprintf("%.2fx", ovw / m4w), "", sprintf("%.2fx", ovr / m4r)
+    }'
+}
+
+bench plain 'plain text' "$plain_bytes" MB
+cmp -s "$work/plain.ovm" "$work/plain.ovmacro.out" || { echo "compare_with_m4: plain text changed" >&2; exit 1; }
+bench calls 'macro calls' "$calls" calls
+bench loop 'loop' "$items" items
+bench cond 'conditionals' "$lines" lines
+
+echo
+echo "median of $runs alternating runs per tool; peak RSS is the largest of those runs; ratio = ovmacro / m4;"
+echo "outputs of the two tools were identical for every workload; ovmacro $("$ovmacro" --version | awk '{ print $2 }'), $(m4 --version | head -n 1)"

@@ -1,0 +1,31 @@
+// What the fuzz targets share: the input size cap, the check that reports a broken invariant, and the
+// entry point that libFuzzer (or the replay program) calls.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <cstdio>
+#include <cstdlib>
+#include <string>
+
+#include "ovmacro/foundations/sub_string.h"
+
+// Inputs longer than this are ignored. Every construct of the language fits in a few hundred bytes, and a
+// short input keeps each run fast, so that the fuzzer spends its time on variety instead of bulk.
+inline constexpr size_t kMaxFuzzInputSize = 4096;
+
+// Stops the run, as a crash that libFuzzer saves, when an invariant of the library does not hold.
+#define FUZZ_CHECK(condition)                                                                      \
+    do {                                                                                           \
+        if (!(condition)) {                                                                        \
+            std::fprintf(stderr, "%s:%d: invariant failed: %s\n", __FILE__, __LINE__, #condition); \
+            std::abort();                                                                          \
+        }                                                                                          \
+    } while (false)
+
+// Whether `inner` lies within `outer` (an empty view at either end included).
+inline bool ViewWithin(orvan::BasicSubString inner, orvan::BasicSubString outer) {
+    return inner.begin() >= outer.begin() && inner.end() <= outer.end() && inner.begin() <= inner.end();
+}
+
+extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size);
