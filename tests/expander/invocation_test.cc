@@ -14,30 +14,12 @@ namespace orvan {
 namespace {
 
 using orvan::testing::MessageOf;
+using orvan::testing::kAtEnd;
+using orvan::testing::ExpandIn;
+using orvan::testing::OffsetIn;
 
-constexpr const char* kAtEnd = "\x01<end>";
+int64 OffsetOf(const std::string& text, const char* marker) { return testing::OffsetOf(text, marker, true); }
 
-// The offset of the last occurrence of `marker` in text (kAtEnd: the text's size).
-int64 OffsetOf(const std::string& text, const char* marker) {
-    if (std::string(marker) == kAtEnd) return static_cast<int64>(text.size());
-    const size_t at = text.rfind(marker);
-    EXPECT_NE(at, std::string::npos) << "marker " << marker << " not in " << text;
-    return static_cast<int64>(at);
-}
-
-// The offset of p in text, or -1 when p does not point into it (or just past its end).
-int64 OffsetIn(const std::string& text, const char* p) {
-    const auto begin = reinterpret_cast<std::uintptr_t>(text.data());
-    const auto pos = reinterpret_cast<std::uintptr_t>(p);
-    if (!p || pos < begin || pos > begin + text.size()) return -1;
-    return static_cast<int64>(pos - begin);
-}
-
-std::string ExpandIn(VarFrame& frame, const std::string& text) {
-    std::string out;
-    MacroExpand(nullptr, &frame, BasicSubString(text), 0, 0, out);
-    return out;
-}
 
 std::string Expand(const std::string& text) {
     FileScopeVarFrame frame;

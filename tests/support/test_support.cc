@@ -10,6 +10,8 @@
 #include <sstream>
 #include <thread>
 
+#include "ovmacro/expander/macro_expander.h"
+
 namespace orvan::testing {
 
 namespace {
@@ -114,6 +116,31 @@ std::string MessageOf(const std::function<void()>& fn, const char*& position) {
 std::string MessageOf(const std::function<void()>& fn) {
     const char* ignored = nullptr;
     return MessageOf(fn, ignored);
+}
+
+int64 OffsetOf(const std::string& text, const char* marker, bool last) {
+    if (std::string(marker) == kAtEnd) return static_cast<int64>(text.size());
+    const size_t at = last ? text.rfind(marker) : text.find(marker);
+    EXPECT_NE(at, std::string::npos) << "marker " << marker << " not in " << text;
+    return static_cast<int64>(at);
+}
+
+int64 OffsetIn(const std::string& text, const char* p) {
+    const auto begin = reinterpret_cast<std::uintptr_t>(text.data());
+    const auto pos = reinterpret_cast<std::uintptr_t>(p);
+    if (!p || pos < begin || pos > begin + text.size()) return -1;
+    return static_cast<int64>(pos - begin);
+}
+
+std::string ExpandIn(VarFrame& frame, const std::string& text) {
+    std::string out;
+    MacroExpand(nullptr, &frame, BasicSubString(text), 0, 0, out);
+    return out;
+}
+
+std::string ExpandText(const std::string& text) {
+    FileScopeVarFrame frame;
+    return ExpandIn(frame, text);
 }
 
 }  // namespace orvan::testing

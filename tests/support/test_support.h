@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "ovmacro/lexer/exceptions.h"
+#include "ovmacro/vars/var_frame.h"
 
 namespace orvan::testing {
 
@@ -41,5 +42,16 @@ std::string ReadFile(const std::string& path);
 std::string MessageOf(const std::function<void()>& fn);
 // The same, also giving the exception's position.
 std::string MessageOf(const std::function<void()>& fn, const char*& position);
+
+// Marks the end of a text where a test names a position by a piece of text (see OffsetOf).
+inline constexpr const char* kAtEnd = "\x01<end>";
+// The offset of the first (or, with `last`, the last) occurrence of `marker` in text; kAtEnd: the text's size.
+int64 OffsetOf(const std::string& text, const char* marker, bool last = false);
+// The offset of p in text, or -1 when p does not point into it (or just past its end).
+int64 OffsetIn(const std::string& text, const char* p);
+// Expands text (which must outlive the frame's definitions) in frame, into a string.
+std::string ExpandIn(VarFrame& frame, const std::string& text);
+// Expands text in a fresh file-scope frame.
+std::string ExpandText(const std::string& text);
 
 }  // namespace orvan::testing

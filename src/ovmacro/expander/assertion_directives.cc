@@ -1,4 +1,5 @@
 // Directives with which a text checks itself while it is expanded: @assert, @assertfails and @fail.
+#include "ovmacro/expander/condition.h"
 #include "ovmacro/expander/macro_expander.h"
 #include "ovmacro/expr/expression_parser.h"
 #include "ovmacro/foundations/compose.h"
@@ -8,20 +9,6 @@
 namespace orvan {
 
 namespace {
-
-// Evaluates an expanded condition; the text must hold exactly one bool expression. The token before the first
-// one reads as "(" in messages.
-bool ParseExpandedCondition(const basic_xstring& expanded) {
-    ExpressionParser parser;
-    parser.GetToken() = LSToken(TK_LPAREN, BasicSubString("("));
-    parser.Init(BasicSubString(expanded));
-    const bool value = parser.ParseBool(false);
-    if (parser.GetTokenType() != TK_EOS)
-        throw LexScannerException(Compose("Expected ) after ", parser.lastToken, " when read ",
-                                          parser.GetToken(), " in expression"),
-                                  parser.GetToken());
-    return value;
-}
 
 // Expands text and reports whether that raised an expansion error. Nothing the text defines survives: the
 // text runs under a scratch frame that takes the place of the file's scope too, so that @exportdef and

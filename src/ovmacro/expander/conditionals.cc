@@ -8,10 +8,6 @@
 
 namespace orvan {
 
-namespace {
-
-// Parses an expanded condition as a bool; the text must hold exactly one expression. The token before the
-// first one reads as "(".
 bool ParseExpandedCondition(const basic_xstring& expanded) {
     ExpressionParser parser;
     parser.GetToken() = LSToken(TK_LPAREN, BasicSubString("("));
@@ -23,8 +19,6 @@ bool ParseExpandedCondition(const basic_xstring& expanded) {
             parser.GetToken());
     return value;
 }
-
-}  // namespace
 
 bool EvaluateConditionText(VarFrame* frame, BasicSubString condition, BasicSubString directiveName,
                            BasicSubString directiveAt) {
