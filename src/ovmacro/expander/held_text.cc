@@ -5,6 +5,8 @@
 #include <map>
 #include <mutex>
 
+#include "ovmacro/expander/macro_expander.h"
+
 namespace orvan {
 
 namespace {
@@ -84,6 +86,16 @@ HeldTextKeeper::~HeldTextKeeper() {
         // definitions that point into it.
         (void)held_.release();
     }
+}
+
+HeldText& HeldTextKeeper::ExpandAndHold(BasicSubString name, BasicSubString source) {
+    basic_xstring expanded;
+    OutputPieces pieces;
+    {
+        VarFrame child(frame_);
+        MacroExpand(nullptr, &child, source, 0, 0, expanded, pieces);
+    }
+    return Hold(std::make_unique<HeldText>(name, std::move(expanded), std::move(pieces), source));
 }
 
 HeldText& HeldTextKeeper::Hold(std::unique_ptr<HeldText> held) {

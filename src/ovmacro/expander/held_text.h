@@ -56,6 +56,8 @@ public:
     HeldTextKeeper& operator=(const HeldTextKeeper&) = delete;
 
     HeldText& Hold(std::unique_ptr<HeldText> held);
+    // Expands `source` in a child frame of the keeper's frame into a held text named `name` and holds it.
+    HeldText& ExpandAndHold(BasicSubString name, BasicSubString source);
 
 private:
     VarFrame* frame_;

@@ -50,15 +50,8 @@ void MacroExpander::ProcessForDirective() {
 
     // Items are views into the expanded list, and so are the bodies of the loop names: the list is a held
     // text, which outlives the loop if its items define anything, and from which errors move to the source.
-    basic_xstring expanded;
-    OutputPieces pieces;
-    {
-        VarFrame child(frame);
-        MacroExpand(nullptr, &child, listText, 0, 0, expanded, pieces);
-    }
     HeldTextKeeper keeper(frame);
-    const HeldText& held =
-        keeper.Hold(std::make_unique<HeldText>(" @for", std::move(expanded), std::move(pieces), listText));
+    const HeldText& held = keeper.ExpandAndHold(" @for", listText);
     const BasicSubString list = held.GetText();
     int64 indent = 0;
     BasicSubString block;

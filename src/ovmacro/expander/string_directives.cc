@@ -150,15 +150,8 @@ void MacroExpander::ProcessSqrBracketDirective() {
     // The text of the second pass is a held text: definitions that it exports to an outer frame (@exportdef,
     // @def +) keep views of it as their names and bodies, so it lives as long as the frame that received
     // them, and an error in such a body later is placed at the source that produced the text.
-    basic_xstring expanded;
-    OutputPieces pieces;
-    {
-        VarFrame child(frame);
-        MacroExpand(nullptr, &child, section, 0, 0, expanded, pieces);
-    }
     HeldTextKeeper keeper(frame);
-    const HeldText& held =
-        keeper.Hold(std::make_unique<HeldText>(" @[", std::move(expanded), std::move(pieces), section));
+    const HeldText& held = keeper.ExpandAndHold(" @[", section);
     const BasicSubString first = held.GetText();
     basic_xstring second;
     try {
