@@ -9,15 +9,19 @@ namespace orvan {
 
 namespace {
 
-thread_local int64 t_depth = 0;
-thread_local int64 t_depthLimit = 0;
-thread_local const char* t_stackLow = nullptr;  // the lowest usable address of this thread's stack
-thread_local bool t_stackKnown = false;
+// The guard runs on every expansion: its per-thread state is reached with the initial-exec model, a plain
+// offset from the thread pointer, instead of a call into the dynamic loader as a shared library otherwise does.
+#define OVMACRO_INITIAL_EXEC_TLS __attribute__((tls_model("initial-exec")))
+
+thread_local int64 t_depth OVMACRO_INITIAL_EXEC_TLS = 0;
+thread_local int64 t_depthLimit OVMACRO_INITIAL_EXEC_TLS = 0;
+thread_local const char* t_stackLow OVMACRO_INITIAL_EXEC_TLS = nullptr;  // the lowest usable address of this thread's stack
+thread_local bool t_stackKnown OVMACRO_INITIAL_EXEC_TLS = false;
 // The work bounds (kNoWorkLimit: none) and what the thread's outermost expansion has used of them.
-thread_local int64 t_expansionLimit = kNoWorkLimit;
-thread_local int64 t_outputLimit = kNoWorkLimit;
-thread_local int64 t_expansions = 0;
-thread_local int64 t_outputChars = 0;
+thread_local int64 t_expansionLimit OVMACRO_INITIAL_EXEC_TLS = kNoWorkLimit;
+thread_local int64 t_outputLimit OVMACRO_INITIAL_EXEC_TLS = kNoWorkLimit;
+thread_local int64 t_expansions OVMACRO_INITIAL_EXEC_TLS = 0;
+thread_local int64 t_outputChars OVMACRO_INITIAL_EXEC_TLS = 0;
 
 // The low end of the calling thread's stack (stacks grow down on x86-64), or null when it cannot be told.
 const char* StackLowEnd() {
