@@ -2,9 +2,12 @@
 // macros read their arguments, bind them in a fresh frame and have their body expanded, evaluated as a typed
 // expression, or evaluated by Python.
 #include <memory>
+#include <optional>
 
 #include "ovmacro/expander/held_text.h"
 #include "ovmacro/expander/macro_expander.h"
+#include "ovmacro/expander/nesting_guard.h"
+#include "ovmacro/expander/plain_text.h"
 #include "ovmacro/expr/expression_parser.h"
 #include "ovmacro/foundations/compose.h"
 #include "ovmacro/foundations/text_format.h"
@@ -28,6 +31,15 @@ basic_xstring InvokingMacroLine(const LSMacroVariable& m, const xvector<LSVariab
         }
     }
     return ss.GetString();
+}
+
+// Whether a macro's body is all ordinary text (see SkipPlainText), so that its expansion is the body itself.
+bool IsPlainText(const LSMacroVariable& m, const VarFrame* bodyParent) {
+    const BasicSubString body = m.GetSubstitutionString();
+    const FileScopeVarFrame* fileScope = bodyParent->GetFileScopeVarFrame();
+    const bool dollarMacrosActive =
+        fileScope && (!fileScope->dollarMacros.empty() || !fileScope->importedFiles.empty());
+    return SkipPlainText(body.begin(), body.end(), m.GetIndent() > 0, dollarMacrosActive).stop == body.end();
 }
 
 }  // namespace
@@ -63,12 +75,18 @@ void MacroExpander::InvokeVariable(LSVariable* v) {
     AdvanceWritePos(cursor.begin(), false);
 
     // A naked macro binds its arguments, and keeps what its body defines, in the invoker's own frame.
-    std::unique_ptr<VarFrame> ownFrame;
-    VarFrame* bodyFrame = frame;
-    if (!m->IsNaked()) {
-        ownFrame = std::make_unique<VarFrame>(m->GetContext() ? m->GetContext() : frame);
-        bodyFrame = ownFrame.get();
+    VarFrame* const parentFrame = m->GetContext() ? m->GetContext() : frame;
+    if (n == 0 && !m->IsPython() && m->GetReturnType() == LSV_Macro && IsPlainText(*m, parentFrame)) {
+        // A body that holds nothing but ordinary text expands to itself: copy it as its expansion would.
+        const BasicSubString body = m->GetSubstitutionString();
+        const int64 before = output->GetCharCount();
+        output->WriteSubStringFromSourceFile(body, GetOutputPos());
+        MacroNestingGuard::ChargeOutput(output->GetCharCount() - before, body.begin());
+        return;
     }
+    std::optional<VarFrame> ownFrame;
+    VarFrame* bodyFrame = frame;
+    if (!m->IsNaked()) bodyFrame = &ownFrame.emplace(parentFrame);
 
     xvector<LSVariable*> bound;
     bound.reserve(static_cast<size_t>(n));
