@@ -28,4 +28,25 @@ inline bool ViewWithin(orvan::BasicSubString inner, orvan::BasicSubString outer)
     return inner.begin() >= outer.begin() && inner.end() <= outer.end() && inner.begin() <= inner.end();
 }
 
+// Whether p points into memory that AddressSanitizer knows to be freed (or otherwise unaddressable); always
+// false in a build without it. A pointer kept after its text died is no fault until it is read, so the
+// targets ask this of the positions and output pieces that the library hands back.
+#if defined(__has_feature)
+#if __has_feature(address_sanitizer)
+#define OVMACRO_FUZZ_ASAN 1
+#endif
+#elif defined(__SANITIZE_ADDRESS__)
+#define OVMACRO_FUZZ_ASAN 1
+#endif
+#ifdef OVMACRO_FUZZ_ASAN
+#include <sanitizer/asan_interface.h>
+inline bool PointsIntoFreedMemory(const void* p) {
+    return p && __asan_address_is_poisoned(p);
+}
+#else
+inline bool PointsIntoFreedMemory(const void*) {
+    return false;
+}
+#endif
+
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size);

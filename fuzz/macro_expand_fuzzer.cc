@@ -13,9 +13,9 @@
 // macro invocation counts) and write kFuzzOutputLimit characters in all; dollar macro replacement stops at
 // kFuzzDollarTextLimit characters. Past a bound the expansion fails like any other, with an IException.
 //
-// Checked besides crashes: the output pieces tile the expanded text exactly, both mappers of output positions
-// agree, and an error that reaches the host carries a message and a position that is null or inside the
-// input, never in a temporary text that has died.
+// Checked besides crashes: the output pieces tile the expanded text exactly, each copied piece holds the
+// characters of a live source, both mappers of output positions agree, and an error that reaches the host
+// carries a message and a position that is null or inside the input, never in a temporary text that has died.
 #include <memory>
 #include <vector>
 
@@ -90,6 +90,17 @@ void CheckPieces(const basic_xstring& expanded, const OutputPieces& pieces) {
         sum += p.size();
     }
     FUZZ_CHECK(sum == size);
+    // A copied piece stands for the very characters of its source, which must still be alive.
+    int64 at = 0;
+    for (const OutputPiece& p : pieces.GetPieces()) {
+        if (p.IsCopied() && !p.source.empty()) {
+            FUZZ_CHECK(!PointsIntoFreedMemory(p.source.begin()) &&
+                       !PointsIntoFreedMemory(p.source.end() - 1));
+            FUZZ_CHECK(expanded.compare(static_cast<size_t>(at), static_cast<size_t>(p.source.size()),
+                                        p.source.begin(), static_cast<size_t>(p.source.size())) == 0);
+        }
+        at += p.size();
+    }
     if (size == 0) return;
     // Positions in increasing order, up to 64 of them spread over the text, each mapped both ways.
     OutputPiecesMonotonePosMapper mapper(pieces);

@@ -1,13 +1,16 @@
 // Regression tests from fuzzing the expander: the work bounds that a fuzzer lowers so that every run of a
-// short text ends (endless @while, output that doubles with each level of macros), and the inputs that the
-// fuzzers found faults with.
+// short text ends (endless @while, output that doubles with each level of macros), and output pieces and
+// error positions that pointed into texts that the expansion had made and freed (a @for list, the call text
+// of a function argument).
 #include <gtest/gtest.h>
 
+#include <cstdint>
 #include <string>
 
 #include "ovmacro/expander/macro_expander.h"
 #include "ovmacro/expander/nesting_guard.h"
 #include "ovmacro/lexer/exceptions.h"
+#include "ovmacro/output/output_pieces.h"
 #include "support/test_support.h"
 
 namespace orvan {
@@ -78,6 +81,67 @@ TEST(WorkLimitsTest, NoBoundByDefault) {
     EXPECT_EQ(Expand(kDoubling + "a9").size(), 8u * 512 + 511);
     const std::string count = "@let int n = 0\n@while(n < 3000){@let n = n + 1\n}n";
     EXPECT_EQ(Expand(count), "3000");
+}
+
+bool InText(const std::string& text, const char* p) {
+    const auto begin = reinterpret_cast<std::uintptr_t>(text.data());
+    const auto pos = reinterpret_cast<std::uintptr_t>(p);
+    return p && pos >= begin && pos <= begin + text.size();
+}
+
+// Output pieces outlive the texts that an expansion makes and expands again; none of them may point into one.
+TEST(HeldTextPiecesTest, CopiedPiecesPointIntoTheSource) {
+    const struct {
+        const char* text;
+        const char* expanded;
+    } cases[] = {
+        {"@for(x in [abc,def]){x\n}", "abc\ndef\n"},
+        {"@def apply(f()) = {f(1)}\n@def g(v) = {<v>}\napply(g)", "<1>"},
+        {"@def L = [p, q]\n@for(x in L){@for(y in [x, `x!`]){y.}}", "p.p!.q.q!."},
+        {"@def apply(f()) = {f(2)}\n@for(x in [@quote(a\n  b), c]){apply(x)}", "a\n   b(2)c(2)"},
+    };
+    for (const auto& c : cases) {
+        SCOPED_TRACE(c.text);
+        const std::string text = c.text;
+        FileScopeVarFrame frame;
+        basic_xstring out;
+        OutputPieces pieces;
+        MacroExpand(nullptr, &frame, BasicSubString(text), 0, 0, out, pieces);
+        EXPECT_EQ(out, c.expanded);
+        int64 at = 0;
+        for (const OutputPiece& p : pieces.GetPieces()) {
+            if (p.IsCopied()) {
+                EXPECT_TRUE(InText(text, p.source.begin()) && InText(text, p.source.end()));
+                EXPECT_EQ(out.substr(static_cast<size_t>(at), static_cast<size_t>(p.source.size())),
+                          p.source.GetString());
+            } else if (p.source.begin()) {
+                EXPECT_TRUE(InText(text, p.source.begin()));
+            }
+            at += p.size();
+        }
+    }
+}
+
+TEST(HeldTextPiecesTest, OutputOfAListItemMapsToTheItem) {
+    const std::string text = "@for(x in [abc, def]){x}";
+    FileScopeVarFrame frame;
+    basic_xstring out;
+    OutputPieces pieces;
+    MacroExpand(nullptr, &frame, BasicSubString(text), 0, 0, out, pieces);
+    ASSERT_EQ(out, "abcdef");
+    EXPECT_EQ(pieces.MapOutputPositionToAddress(1), text.data() + text.find("abc") + 1);
+    EXPECT_EQ(pieces.MapOutputPositionToAddress(3), text.data() + text.find("def"));
+}
+
+// The error arises after the call text of f has died: its position must not point into it.
+TEST(HeldTextPiecesTest, ErrorInTheExpansionOfACallTextIsPlacedInTheSource) {
+    for (const std::string text :
+         {"@def int t(f())=f()\nt()", "@def int t(f())={f(1 2)}\n@def g(a) = a\nt(g)"}) {
+        SCOPED_TRACE(text);
+        const char* position = nullptr;
+        MessageOf([&] { Expand(text); }, position);
+        EXPECT_TRUE(InText(text, position));
+    }
 }
 
 }  // namespace

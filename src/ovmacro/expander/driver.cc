@@ -1,4 +1,5 @@
 // The main loop of the expander: copies ordinary text, finds macro names and dispatches @-directives.
+#include "ovmacro/expander/held_text.h"
 #include "ovmacro/expander/macro_expander.h"
 #include "ovmacro/expander/nesting_guard.h"
 #include "ovmacro/expander/plain_text.h"
@@ -16,7 +17,8 @@ MacroExpander::MacroExpander(ImportHandler* importHandler, VarFrame* frame, Basi
       outputIndent(outputIndent),
       text(text),
       cursor(text),
-      writePos(text.begin()) {}
+      writePos(text.begin()),
+      textIsHeld(IsInHeldText(text.begin())) {}
 
 void MacroExpander::AdvanceWritePos(const char* p, bool write) {
     if (write && p > writePos) WriteSubStringFromSourceFile(BasicSubString(writePos, p));
@@ -24,10 +26,14 @@ void MacroExpander::AdvanceWritePos(const char* p, bool write) {
 }
 
 // Every write is counted against the work bound of the outermost expansion (none unless a fuzzer or a test
-// set one), inserted indentation included.
+// set one), inserted indentation included. Pieces that would point into a held text, which may die before
+// the output, point to the texts that produced it instead (only a held text's expansion can write such).
 void MacroExpander::WriteSubStringFromSourceFile(BasicSubString s) {
     const int64 before = output->GetCharCount();
-    output->WriteSubStringFromSourceFile(s, outputIndent);
+    if (textIsHeld)
+        WriteCopiedText(*output, s, outputIndent);
+    else
+        output->WriteSubStringFromSourceFile(s, outputIndent);
     MacroNestingGuard::ChargeOutput(output->GetCharCount() - before, s.begin());
 }
 
@@ -35,7 +41,10 @@ void MacroExpander::WriteCalculatedSubString(BasicSubString s) { WriteCalculated
 
 void MacroExpander::WriteCalculatedSubString(BasicSubString s, BasicSubString source) {
     const int64 before = output->GetCharCount();
-    output->WriteCalculatedSubString(s, source, outputIndent);
+    if (textIsHeld)
+        WriteCalculatedText(*output, s, source, outputIndent);
+    else
+        output->WriteCalculatedSubString(s, source, outputIndent);
     MacroNestingGuard::ChargeOutput(output->GetCharCount() - before, source.begin());
 }
 

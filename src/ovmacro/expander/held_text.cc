@@ -1,5 +1,6 @@
 #include "ovmacro/expander/held_text.h"
 
+#include <atomic>
 #include <functional>
 #include <iterator>
 #include <map>
@@ -16,6 +17,7 @@ namespace {
 struct Registry {
     std::mutex lock;
     std::map<const char*, const HeldText*, std::less<const char*>> byBegin;
+    std::atomic<size_t> count{0};  // byBegin.size(), read without the lock by the writers' fast path
 };
 
 Registry& TheRegistry() {
@@ -37,6 +39,7 @@ HeldText::HeldText(BasicSubString name, basic_xstring text, OutputPieces pieces,
     Registry& registry = TheRegistry();
     const std::lock_guard<std::mutex> hold(registry.lock);
     registry.byBegin[value.data()] = this;
+    registry.count = registry.byBegin.size();
 }
 
 HeldText::~HeldText() {
@@ -44,6 +47,7 @@ HeldText::~HeldText() {
     Registry& registry = TheRegistry();
     const std::lock_guard<std::mutex> hold(registry.lock);
     registry.byBegin.erase(value.data());
+    registry.count = registry.byBegin.size();
 }
 
 void HeldText::MovePositionOut(LexScannerException& e) const {
@@ -65,6 +69,70 @@ void MovePositionOutOfHeldTexts(LexScannerException& e) {
         held->MovePositionOut(e);
         if (e.GetPosition() == pos) return;
     }
+}
+
+namespace {
+
+// The live held text in which a run starting at p lies (p before its end), or null.
+const HeldText* HeldTextAt(const char* p) {
+    Registry& registry = TheRegistry();
+    if (registry.count == 0 || !p) return nullptr;
+    const std::lock_guard<std::mutex> hold(registry.lock);
+    auto it = registry.byBegin.upper_bound(p);
+    if (it == registry.byBegin.begin()) return nullptr;
+    const HeldText* held = std::prev(it)->second;
+    const std::less<const char*> lt;
+    return lt(p, held->GetText().end()) ? held : nullptr;
+}
+
+// A calculated piece's source moved out of held texts: only its begin is used to place positions.
+BasicSubString SourceOutsideHeldTexts(BasicSubString source) {
+    if (TheRegistry().count == 0 || !source.begin()) return source;
+    LexScannerException probe("", source.begin());
+    MovePositionOutOfHeldTexts(probe);
+    if (probe.GetPosition() == source.begin()) return source;
+    return BasicSubString(probe.GetPosition(), probe.GetPosition());
+}
+
+}  // namespace
+
+bool IsInHeldText(const char* p) { return HeldTextAt(p) != nullptr; }
+
+void WriteCopiedText(ExpandedOutput& output, BasicSubString s, int64 indent) {
+    const HeldText* held = HeldTextAt(s.begin());
+    if (!held) {
+        output.WriteSubStringFromSourceFile(s, indent);
+        return;
+    }
+    // The part of s in the held text goes piece by piece of the held text; a part beyond it (none in
+    // practice: a run lies in the text being expanded) is written on its own.
+    const BasicSubString text = held->GetText();
+    const char* const end = s.end() < text.end() ? s.end() : text.end();
+    const int64 from = s.begin() - text.begin(), to = end - text.begin();
+    int64 pieceBegin = 0;
+    for (const OutputPiece& piece : held->GetPieces().GetPieces()) {
+        if (pieceBegin >= to) break;
+        const int64 pieceEnd = pieceBegin + piece.size();
+        const int64 lo = from > pieceBegin ? from : pieceBegin, hi = to < pieceEnd ? to : pieceEnd;
+        if (lo < hi && piece.IsCopied()) {
+            const char* src = piece.source.begin() + (lo - pieceBegin);
+            WriteCopiedText(output, BasicSubString(src, src + (hi - lo)), indent);
+        } else if (lo < hi) {
+            const BasicSubString chars(text.begin() + lo, text.begin() + hi);
+            output.WriteCalculatedSubString(chars, SourceOutsideHeldTexts(piece.source), indent);
+        }
+        pieceBegin = pieceEnd;
+    }
+    if (pieceBegin < to) {
+        // Characters that no piece covers stand for what the held text as a whole was made from.
+        const BasicSubString chars(text.begin() + (from > pieceBegin ? from : pieceBegin), end);
+        output.WriteCalculatedSubString(chars, SourceOutsideHeldTexts(held->GetSource()), indent);
+    }
+    if (end < s.end()) WriteCopiedText(output, BasicSubString(end, s.end()), indent);
+}
+
+void WriteCalculatedText(ExpandedOutput& output, BasicSubString s, BasicSubString source, int64 indent) {
+    output.WriteCalculatedSubString(s, SourceOutsideHeldTexts(source), indent);
 }
 
 HeldTextKeeper::HeldTextKeeper(VarFrame* frame) : frame_(frame) {

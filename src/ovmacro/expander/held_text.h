@@ -17,6 +17,7 @@
 #include <memory>
 
 #include "ovmacro/lexer/exceptions.h"
+#include "ovmacro/output/expanded_output.h"
 #include "ovmacro/output/output_pieces.h"
 #include "ovmacro/vars/var_frame.h"
 
@@ -33,6 +34,8 @@ public:
     HeldText& operator=(const HeldText&) = delete;
 
     BasicSubString GetText() const { return BasicSubString(value); }
+    const OutputPieces& GetPieces() const { return pieces_; }
+    BasicSubString GetSource() const { return source_; }
     // Moves e's position, if it lies in this text (its end included), back to the source.
     void MovePositionOut(LexScannerException& e) const;
 
@@ -44,6 +47,15 @@ private:
 // Moves e's position out of every held text that is still alive, again and again while it lands in another
 // one, so that it ends in a loaded text (or where no held text can place it further).
 void MovePositionOutOfHeldTexts(LexScannerException& e);
+
+// Output pieces outlive the held texts that were expanded into the output (a @for list dies with its loop, a
+// call text with its call), so no piece may point into one. The two writers below write as ExpandedOutput
+// does, but a piece that would point into a live held text points instead to the texts that produced that
+// part of it: copied where the held text copied them, calculated and mapped to their source otherwise.
+// Whether p lies in a live held text (its end excluded); cheap when none lives.
+bool IsInHeldText(const char* p);
+void WriteCopiedText(ExpandedOutput& output, BasicSubString s, int64 indent);
+void WriteCalculatedText(ExpandedOutput& output, BasicSubString s, BasicSubString source, int64 indent);
 
 // Owns a held text while it is expanded. When the keeper goes (also when an error passes), the outermost of
 // `frame` and its parents that received a definition since the keeper was made takes the text over; when

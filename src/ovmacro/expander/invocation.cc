@@ -80,7 +80,7 @@ void MacroExpander::InvokeVariable(LSVariable* v) {
         // A body that holds nothing but ordinary text expands to itself: copy it as its expansion would.
         const BasicSubString body = m->GetSubstitutionString();
         const int64 before = output->GetCharCount();
-        output->WriteSubStringFromSourceFile(body, GetOutputPos());
+        WriteCopiedText(*output, body, GetOutputPos());
         MacroNestingGuard::ChargeOutput(output->GetCharCount() - before, body.begin());
         return;
     }

@@ -118,6 +118,9 @@ private:
     BasicSubString cursor;
     BasicSubString currentToken;
     const char* writePos;
+    // Whether `text` lies in a held text (a @for list, a call text): its output pieces are then written
+    // through that text's pieces, since it may die before them.
+    bool textIsHeld;
 };
 
 }  // namespace orvan
