@@ -106,7 +106,14 @@ void MacroExpander::Expand() {
             }
         }
         const char* start = cursor.begin();
-        const LSToken token = LsScanToken(cursor, true);
+        // A name the fast lane stopped at is already read.
+        LSToken token;
+        if (start == run.stop && run.nameEnd) {
+            token = LSToken(TK_IDENTIFIER, start, run.nameEnd);
+            cursor.SetBegin(run.nameEnd);
+        } else {
+            token = LsScanToken(cursor, true);
+        }
         if (token.type == TK_EOS) {
             AdvanceWritePos(cursor.begin(), true);
             return;
@@ -115,7 +122,7 @@ void MacroExpander::Expand() {
             case TK_IDENTIFIER: {
                 LSVariable* v = FindVariable(token.text);
                 if (!v) break;
-                flushOrdinary();
+                // The ordinary text and the blanks before the name go in one run.
                 currentToken = token.text;
                 AdvanceWritePos(start, true);
                 InvokeVariable(v);

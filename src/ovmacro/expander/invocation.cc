@@ -3,6 +3,7 @@
 // expression, or evaluated by Python.
 #include <memory>
 #include <optional>
+#include <span>
 
 #include "ovmacro/expander/held_text.h"
 #include "ovmacro/expander/macro_expander.h"
@@ -10,6 +11,7 @@
 #include "ovmacro/expander/plain_text.h"
 #include "ovmacro/expr/expression_parser.h"
 #include "ovmacro/foundations/compose.h"
+#include "ovmacro/foundations/small_buffer.h"
 #include "ovmacro/foundations/text_format.h"
 #include "ovmacro/lexer/section_scanners.h"
 #include "ovmacro/python/python_bridge.h"
@@ -19,7 +21,7 @@ namespace orvan {
 namespace {
 
 // "\n    invoking macro m(a,b) with a=x+1, b=y"
-basic_xstring InvokingMacroLine(const LSMacroVariable& m, const xvector<LSVariable*>& bound) {
+basic_xstring InvokingMacroLine(const LSMacroVariable& m, std::span<LSVariable* const> bound) {
     StringStream ss;
     ss << "\n    invoking macro " << m;
     if (!bound.empty()) {
@@ -58,7 +60,9 @@ void MacroExpander::InvokeVariable(LSVariable* v) {
     }
 
     const int64 n = m->GetNumArgs();
-    xvector<BasicSubString> actual(static_cast<size_t>(n));
+    // Macros rarely take more than a few arguments: their texts and bindings then need no allocation.
+    constexpr size_t kInlineArgs = 4;
+    SmallBuffer<BasicSubString, kInlineArgs> actual(static_cast<size_t>(n));
     if (n > 0) {
         const LSToken open = ReadToken();
         if (open.type != TK_LPAREN)
@@ -88,8 +92,7 @@ void MacroExpander::InvokeVariable(LSVariable* v) {
     VarFrame* bodyFrame = frame;
     if (!m->IsNaked()) bodyFrame = &ownFrame.emplace(parentFrame);
 
-    xvector<LSVariable*> bound;
-    bound.reserve(static_cast<size_t>(n));
+    SmallBuffer<LSVariable*, kInlineArgs> bound(static_cast<size_t>(n));
     for (int64 i = 0; i < n; ++i) {
         const LSFormalArg& formal = m->GetArg(i);
         const BasicSubString arg = actual[static_cast<size_t>(i)];
@@ -110,7 +113,7 @@ void MacroExpander::InvokeVariable(LSVariable* v) {
             binding = new LSValueVariable(formal.type, formal.name, BasicSubString(value));
         }
         bodyFrame->AddVariable(binding);
-        bound.push_back(binding);
+        bound[static_cast<size_t>(i)] = binding;
     }
 
     const BasicSubString body = m->GetSubstitutionString();
@@ -137,7 +140,7 @@ void MacroExpander::InvokeVariable(LSVariable* v) {
             WriteCalculatedSubString(BasicSubString(value));
         }
     } catch (LexScannerException& e) {
-        e.AppendCallContextLine(InvokingMacroLine(*m, bound));
+        e.AppendCallContextLine(InvokingMacroLine(*m, bound.view()));
         throw;
     }
 }

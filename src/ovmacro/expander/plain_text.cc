@@ -3,6 +3,10 @@
 #include <array>
 #include <cstring>
 
+#if defined(__SSE2__)
+#include <emmintrin.h>
+#endif
+
 #include "ovmacro/foundations/scanning.h"
 #include "ovmacro/lexer/token_scanner.h"
 #include "ovmacro/vars/name_filter.h"
@@ -45,22 +49,74 @@ constexpr std::array<CharClass, 256> MakeClasses() {
 
 constexpr std::array<CharClass, 256> kClasses = MakeClasses();
 
+constexpr std::array<bool, 256> MakeIdentifierBytes() {
+    std::array<bool, 256> t{};
+    for (int c = 0; c < 256; ++c) t[c] = kClasses[c] == kIdentifier || kClasses[c] == kDigit;
+    return t;
+}
+
+constexpr std::array<bool, 256> kIdentifierBytes = MakeIdentifierBytes();
+
+// The end of the identifier bytes that begin at p. Words end at unpredictable lengths, so a byte-by-byte loop
+// costs a mispredicted branch per word; sixteen bytes are classified at once where that many are left.
+const char* EndOfIdentifier(const char* p, const char* end) {
+#if defined(__SSE2__)
+    while (end - p >= 16) {
+        const __m128i x = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p));
+        const __m128i lower = _mm_or_si128(x, _mm_set1_epi8(0x20));
+        const __m128i letter =
+            _mm_and_si128(_mm_cmpgt_epi8(lower, _mm_set1_epi8('a' - 1)), _mm_cmplt_epi8(lower, _mm_set1_epi8('z' + 1)));
+        const __m128i digit =
+            _mm_and_si128(_mm_cmpgt_epi8(x, _mm_set1_epi8('0' - 1)), _mm_cmplt_epi8(x, _mm_set1_epi8('9' + 1)));
+        const __m128i high = _mm_cmplt_epi8(x, _mm_setzero_si128());  // bytes from 0x80 up
+        const __m128i underscore = _mm_cmpeq_epi8(x, _mm_set1_epi8('_'));
+        const __m128i word = _mm_or_si128(_mm_or_si128(letter, digit), _mm_or_si128(high, underscore));
+        const unsigned others = ~static_cast<unsigned>(_mm_movemask_epi8(word)) & 0xFFFFu;
+        if (others != 0) return p + __builtin_ctz(others);
+        p += 16;
+    }
+#endif
+    while (p < end && kIdentifierBytes[static_cast<unsigned char>(*p)]) ++p;
+    return p;
+}
+
 }  // namespace
 
 PlainTextRun SkipPlainText(const char* p, const char* end, bool lineFeedsNeedWork, bool dollarMacrosActive) {
     const char* ordinaryEnd = p;
     while (p < end) {
         const unsigned char c = static_cast<unsigned char>(*p);
-        switch (kClasses[c]) {
-            case kBlank: ++p; continue;
+        const CharClass k = kClasses[c];
+        // Words and the blanks between them are most of any text: they take the shortest way.
+        if (k == kIdentifier) {
+            // r or R directly before a quote begins a raw literal, not an identifier.
+            if ((c == 'r' || c == 'R') && end - p >= 2 && (p[1] == '"' || p[1] == '\'')) {
+                if (p[1] == '"' && dollarMacrosActive) return {p, ordinaryEnd, nullptr};
+                BasicSubString s(p, end);
+                LsScanLiteralString(s, p[1], p[1] == '"' ? "double quoted string" : "single quoted string");
+                ordinaryEnd = p = s.begin();
+                continue;
+            }
+            const char* q = EndOfIdentifier(p + 1, end);
+            if (NameFilter::MayContain(BasicSubString(p, q))) return {p, ordinaryEnd, q};
+            ordinaryEnd = p = q;
+            continue;
+        }
+        if (k == kBlank) {
+            ++p;
+            continue;
+        }
+        switch (k) {
+            case kIdentifier:
+            case kBlank: continue;  // taken above
             case kLineFeed:
-                if (lineFeedsNeedWork) return {p, ordinaryEnd};
+                if (lineFeedsNeedWork) return {p, ordinaryEnd, nullptr};
                 ordinaryEnd = ++p;
                 continue;
             case kPunctuation: ordinaryEnd = ++p; continue;
             case kPlus:
                 if (end - p >= 2 && p[1] == '+') {
-                    if (end - p >= 3 && p[2] == '=') return {p, ordinaryEnd};  // the scanner reports it
+                    if (end - p >= 3 && p[2] == '=') return {p, ordinaryEnd, nullptr};  // the scanner reports it
                     p += 2;
                 } else {
                     ++p;
@@ -74,7 +130,7 @@ PlainTextRun SkipPlainText(const char* p, const char* end, bool lineFeedsNeedWor
                 } else if (end - p >= 2 && p[1] == '*') {
                     const std::string_view rest(p + 2, static_cast<size_t>(end - p - 2));
                     const size_t close = rest.find("*/");
-                    if (close == std::string_view::npos) return {p, ordinaryEnd};  // the scanner reports it
+                    if (close == std::string_view::npos) return {p, ordinaryEnd, nullptr};  // the scanner reports it
                     p += 2 + close + 2;
                 } else {
                     ++p;
@@ -83,9 +139,18 @@ PlainTextRun SkipPlainText(const char* p, const char* end, bool lineFeedsNeedWor
                 continue;
             }
             case kDigit: {
-                BasicSubString s(p, end);
-                LsScanNumber(s);
-                ordinaryEnd = p = s.begin();
+                // A run of digits followed by anything that cannot continue a number is a whole number token;
+                // anything else (a hex prefix, a fraction, an exponent) goes through the number scanner.
+                const char* q = p + 1;
+                while (q < end && kClasses[static_cast<unsigned char>(*q)] == kDigit) ++q;
+                const bool maybeLonger =
+                    q < end && (*q == '.' || *q == 'e' || *q == 'E' || (q == p + 1 && (*q == 'x' || *q == 'X')));
+                if (maybeLonger) {
+                    BasicSubString s(p, end);
+                    LsScanNumber(s);
+                    q = s.begin();
+                }
+                ordinaryEnd = p = q;
                 continue;
             }
             case kSingleQuote: {
@@ -95,31 +160,16 @@ PlainTextRun SkipPlainText(const char* p, const char* end, bool lineFeedsNeedWor
                 continue;
             }
             case kDoubleQuote: {
-                if (dollarMacrosActive) return {p, ordinaryEnd};
+                if (dollarMacrosActive) return {p, ordinaryEnd, nullptr};
                 BasicSubString s(p, end);
                 LsScanLiteralString(s, '"', "double quoted string");
                 ordinaryEnd = p = s.begin();
                 continue;
             }
-            case kIdentifier: {
-                // r or R directly before a quote begins a raw literal, not an identifier.
-                if ((c == 'r' || c == 'R') && end - p >= 2 && (p[1] == '"' || p[1] == '\'')) {
-                    if (p[1] == '"' && dollarMacrosActive) return {p, ordinaryEnd};
-                    BasicSubString s(p, end);
-                    LsScanLiteralString(s, p[1], p[1] == '"' ? "double quoted string" : "single quoted string");
-                    ordinaryEnd = p = s.begin();
-                    continue;
-                }
-                const char* q = p + 1;
-                while (q < end && IsIdentifierChar(*q)) ++q;
-                if (NameFilter::MayContain(BasicSubString(p, q))) return {p, ordinaryEnd};
-                ordinaryEnd = p = q;
-                continue;
-            }
-            case kStop: return {p, ordinaryEnd};
+            case kStop: return {p, ordinaryEnd, nullptr};
         }
     }
-    return {p, ordinaryEnd};
+    return {p, ordinaryEnd, nullptr};
 }
 
 }  // namespace orvan

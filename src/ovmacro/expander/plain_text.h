@@ -8,6 +8,7 @@ namespace orvan {
 struct PlainTextRun {
     const char* stop;         // where something needs the main loop: a token start, or the end of the text
     const char* ordinaryEnd;  // the end of the last token or line feed skipped: the blanks after it stay pending
+    const char* nameEnd;      // when the stop is an identifier that may name a variable, its end; else null
 };
 
 // Skips, from a token boundary, the tokens that the main loop would copy unchanged: blanks, line feeds (unless

@@ -1,5 +1,7 @@
 #include "ovmacro/foundations/files.h"
 
+#include "ovmacro/foundations/large_buffers.h"
+
 #include <cerrno>
 #include <cstring>
 
@@ -54,6 +56,7 @@ bool ReadStringFromFile(const basic_xstring& path, basic_xstring& out, bool text
     ::fcntl(fd, F_SETFL, ::fcntl(fd, F_GETFL) & ~O_NONBLOCK);
     basic_xstring text;
     text.reserve(static_cast<size_t>(st.st_size));
+    AdviseLargeBuffer(text.data(), text.capacity());
     const bool ok = ReadAll(fd, text, error);
     ::close(fd);
     if (!ok) return false;

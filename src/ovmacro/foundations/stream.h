@@ -13,6 +13,7 @@
 #include <cstdio>
 #include <string_view>
 
+#include "ovmacro/foundations/large_buffers.h"
 #include "ovmacro/foundations/sub_string.h"
 #include "ovmacro/foundations/types.h"
 
@@ -70,7 +71,10 @@ xostream& operator<<(xostream& os, bool v) = delete;  // say "true"/"false" or 1
 // Collects text in memory.
 class StringStream : public xostream {
 public:
-    explicit StringStream(size_t capacityHint = 4096) { text_.reserve(capacityHint); }
+    explicit StringStream(size_t capacityHint = 4096) {
+        text_.reserve(capacityHint);
+        AdviseLargeBuffer(text_.data(), text_.capacity());
+    }
     // Hands over the text collected so far and leaves the stream empty.
     basic_xstring GetString() {
         basic_xstring out;

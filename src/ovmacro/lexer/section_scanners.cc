@@ -211,6 +211,23 @@ LSToken ScanArgument(BasicSubString& s, BasicSubString& arg, EToken terminator) 
         return LsScanToken(s, false);
     }
 
+    // Most arguments are one name followed by the comma or the terminator: read those without tokens. An
+    // identifier absorbs every letter, digit and '_' that follows it, so the token scanner would read the
+    // same name; anything else goes the general way below.
+    if (!s.empty() && IsIdentifierStart(*start) &&
+        !((*start == 'r' || *start == 'R') && s.size() >= 2 && (start[1] == '"' || start[1] == '\''))) {
+        const char* p = start + 1;
+        while (p < s.end() && IsIdentifierChar(*p)) ++p;
+        const char* nameEnd = p;
+        while (p < s.end() && IsWhiteSpace(*p)) ++p;
+        const EToken kind = p == s.end() ? TK_NONE : (*p == ',' ? TK_COMMA : (*p == ')' ? TK_RPAREN : TK_NONE));
+        if (kind != TK_NONE && (kind == TK_COMMA || kind == terminator)) {
+            arg = BasicSubString(start, nameEnd);
+            s.SetBegin(p + 1);
+            return LSToken(kind, p, p + 1);
+        }
+    }
+
     arg = BasicSubString(start, start);
     // Only one bracket kind is counted at a time, so "(a[b)" is one balanced group.
     EToken trackedOpen = TK_NONE;

@@ -18,35 +18,60 @@ void ExpandedOutput::WriteRun(const char* p, int64 n) {
     if (n <= 0) return;
     stream_->put(p, n);
     charCount_ += n;
-    const char* end = p + n;
-    const char* lastLf = static_cast<const char*>(memrchr(p, '\n', static_cast<size_t>(n)));
-    const char* lineStart = lastLf ? lastLf + 1 : p;
-    if (lastLf && lineStart == end) {
-        column_ = -1;
+    // The column after the run counts from its last line feed, or goes on from the current column. Runs are
+    // mostly a few characters long, and one pass over them costs less than two library calls.
+    const char* const end = p + n;
+    const char* lineStart = nullptr;
+    int64 tabs = 0;
+    if (n <= 32) {
+        for (const char* q = p; q < end; ++q) {
+            if (*q == '\n') {
+                lineStart = q + 1;
+                tabs = 0;
+            } else {
+                tabs += *q == '\t';
+            }
+        }
+    } else {
+        const char* lastLf = static_cast<const char*>(memrchr(p, '\n', static_cast<size_t>(n)));
+        if (lastLf) lineStart = lastLf + 1;
+        for (const char* q = lineStart ? lineStart : p; q < end; ++q) tabs += *q == '\t';
+    }
+    if (lineStart == end) {
+        column_ = -1;  // the run ends its line: the next line's indentation is still to be written
         return;
     }
-    int64 col = lastLf ? 0 : (column_ < 0 ? 0 : column_);
-    for (const char* q = lineStart; q < end; ++q) col += *q == '\t' ? 4 : 1;
-    column_ = col;
+    const int64 before = lineStart ? 0 : (column_ < 0 ? 0 : column_);
+    column_ = before + (end - (lineStart ? lineStart : p)) + 3 * tabs;
+}
+
+bool ExpandedOutput::StartLine(int64 indent) {
+    if (column_ >= 0) return false;
+    if (indent <= 0) {
+        column_ = 0;
+        return false;
+    }
+    WriteIndentation(indent);
+    column_ = indent;
+    return true;
 }
 
 void ExpandedOutput::WriteSubStringFromSourceFile(BasicSubString s, int64 indent) {
     const char* p = s.begin();
     const char* end = s.end();
+    if (indent <= 0) {
+        // Without indentation to insert the whole run goes at once.
+        if (p == end) return;
+        if (column_ < 0) column_ = 0;
+        WriteRun(p, end - p);
+        pieces_.push_back(OutputPiece(s, 0));
+        return;
+    }
     while (p < end) {
-        if (column_ < 0) {
-            if (indent > 0) {
-                WriteIndentation(indent);
-                pieces_.push_back(OutputPiece(BasicSubString(), indent));
-            }
-            column_ = indent;
-        }
-        // Without indentation the rest goes in one run; with it, up to and including the next line feed.
-        const char* runEnd = end;
-        if (indent > 0) {
-            const char* lf = static_cast<const char*>(std::memchr(p, '\n', static_cast<size_t>(end - p)));
-            if (lf) runEnd = lf + 1;
-        }
+        if (StartLine(indent)) pieces_.push_back(OutputPiece(BasicSubString(), indent));
+        // Up to and including the next line feed: the line after it gets its indentation first.
+        const char* lf = static_cast<const char*>(std::memchr(p, '\n', static_cast<size_t>(end - p)));
+        const char* runEnd = lf ? lf + 1 : end;
         WriteRun(p, runEnd - p);
         pieces_.push_back(OutputPiece(BasicSubString(p, runEnd), 0));
         p = runEnd;
@@ -59,14 +84,9 @@ void ExpandedOutput::WriteCalculatedSubString(BasicSubString s, BasicSubString s
     const char* p = s.begin();
     const char* end = s.end();
     while (p < end) {
-        if (column_ < 0) {
-            if (indent > 0) {
-                WriteIndentation(indent);
-                n += indent;
-            }
-            column_ = indent;
-        }
-        const char* lf = static_cast<const char*>(std::memchr(p, '\n', static_cast<size_t>(end - p)));
+        if (StartLine(indent)) n += indent;
+        const char* lf = indent > 0 ? static_cast<const char*>(std::memchr(p, '\n', static_cast<size_t>(end - p)))
+                                    : nullptr;
         const char* runEnd = lf ? lf + 1 : end;
         WriteRun(p, runEnd - p);
         p = runEnd;

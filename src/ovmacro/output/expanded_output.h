@@ -29,6 +29,9 @@ public:
 
 private:
     void WriteIndentation(int64 indent);
+    // At a line start whose indentation is still to be written: writes it (when indent > 0, then true) and
+    // sets the column.
+    bool StartLine(int64 indent);
     // Writes a run that holds no line start needing indentation, and advances the column.
     void WriteRun(const char* p, int64 n);
 

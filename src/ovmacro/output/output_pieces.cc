@@ -19,19 +19,6 @@ const char* AddressInPiece(const OutputPiece& p, int64 offsetInPiece) {
 
 }  // namespace
 
-void OutputPieces::push_back(const OutputPiece& p) {
-    if (p.IsCopied() && !pieces_.empty()) {
-        OutputPiece& last = pieces_.back();
-        if (last.IsCopied() && last.source.end() == p.source.begin() && p.source.begin() != nullptr) {
-            last.source.SetEnd(p.source.end());
-            total_ += p.size();
-            return;
-        }
-    }
-    pieces_.push_back(p);
-    total_ += p.size();
-}
-
 const char* OutputPieces::MapOutputPositionToAddress(int64 pos) const {
     if (pos < 0 || pos >= total_) PositionOutsideOutput(pos, total_);
     int64 start = 0;

@@ -25,7 +25,18 @@ class OutputPieces {
 public:
     // Appends a piece. A copied piece that continues the previous copied piece in the source (its begin is
     // the previous one's end) extends it instead: the mapping of every position stays exactly the same.
-    void push_back(const OutputPiece& p);
+    void push_back(const OutputPiece& p) {
+        if (p.IsCopied() && !pieces_.empty()) {
+            OutputPiece& last = pieces_.back();
+            if (last.IsCopied() && last.source.end() == p.source.begin() && p.source.begin() != nullptr) {
+                last.source.SetEnd(p.source.end());
+                total_ += p.size();
+                return;
+            }
+        }
+        pieces_.push_back(p);
+        total_ += p.size();
+    }
     // The sum of the pieces' sizes: the number of characters they cover.
     int64 size() const { return total_; }
     void swap(OutputPieces& o) noexcept {

@@ -6,6 +6,7 @@
 #pragma once
 
 #include <atomic>
+#include <cstddef>
 #include <cstdint>
 
 #include "ovmacro/foundations/sub_string.h"
@@ -25,10 +26,23 @@ public:
 
 private:
     static constexpr std::uint32_t kBits = 1u << 16;
+    // Constant time in the name's length: the expander hashes every word of the text it copies. The first and
+    // last (up to) four bytes and the length decide the bit; names that share them share a bit, which only
+    // costs a lookup.
     static std::uint32_t Hash(BasicSubString name) {
-        std::uint32_t h = 2166136261u;  // FNV-1a
-        for (char c : name.view()) h = (h ^ static_cast<unsigned char>(c)) * 16777619u;
-        return (h ^ (h >> 16)) & (kBits - 1);
+        const unsigned char* p = reinterpret_cast<const unsigned char*>(name.begin());
+        const std::size_t n = name.view().size();
+        std::uint64_t key = n;
+        if (n >= 4) {
+            key |= (std::uint64_t{Load4(p)} << 8) ^ (std::uint64_t{Load4(p + n - 4)} << 32);
+        } else if (n > 0) {
+            key |= std::uint64_t{p[0]} << 8 | std::uint64_t{p[n / 2]} << 16 | std::uint64_t{p[n - 1]} << 24;
+        }
+        return static_cast<std::uint32_t>((key * 0x9E3779B97F4A7C15u) >> (64 - 16)) & (kBits - 1);
+    }
+    static std::uint32_t Load4(const unsigned char* p) {
+        return std::uint32_t{p[0]} | std::uint32_t{p[1]} << 8 | std::uint32_t{p[2]} << 16 |
+               std::uint32_t{p[3]} << 24;
     }
     static std::atomic<std::uint64_t> bits_[kBits / 64];
 };

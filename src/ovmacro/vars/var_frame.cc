@@ -41,6 +41,7 @@ LSVariable* VarFrame::Find(BasicSubString name, const char* pos) {
 }
 
 LSVariable* VarFrame::FindLocal(BasicSubString name, const char* pos) {
+    if (allImports.empty()) return vars.Find(name);  // nothing to break a tie between
     xvector<const VarFrame*> visiting;
     return FindLocalGuarded(name, pos, visiting);
 }
