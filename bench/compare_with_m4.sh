@@ -1,6 +1,7 @@
 #!/usr/bin/env bash
-# Runs ovmacro and GNU m4 side by side on the same work and reports, for each workload, the median wall time,
-# the throughput, the peak resident memory and the ratio ovmacro/m4, all measured in this one run.
+# Runs ovmacro and GNU m4 side by side on the same work and reports, for each workload, the median wall and
+# CPU times, the throughput, the peak resident memory and the speed-up of ovmacro over m4 (m4's time divided
+# by ovmacro's), all measured in this one run.
 #
 # Needs: GNU m4 and /usr/bin/time (scripts/install-deps.sh installs m4; this script installs nothing). It
 # builds ovmacro in Release into build/bench and writes its inputs and outputs into a temporary directory,
@@ -114,29 +115,32 @@ awk -v groups="$groups" -v q="'" 'BEGIN {
   }
 }' >"$work/cond.m4"
 
-# run OUTPUT_FILE COMMAND...: runs once with output to the file; sets wall (seconds) and rss (KB).
+# run OUTPUT_FILE COMMAND...: runs once with output to the file; sets wall and cpu (user + system) in seconds,
+# and rss (KB). CPU time says more than wall time on a machine that other work shares.
 run() {
   local out=$1
   shift
   local start end
   start=$(date +%s%N)
-  /usr/bin/time -f '%e %M' -o "$work/time" "$@" >"$out" || {
+  /usr/bin/time -f '%e %M %U %S' -o "$work/time" "$@" >"$out" || {
     echo "compare_with_m4: failed: $*" >&2
     exit 1
   }
   end=$(date +%s%N)
   wall=$(awk -v ns=$((end - start)) 'BEGIN { printf "%.4f", ns / 1e9 }')
   rss=$(awk 'END { print $2 }' "$work/time")
+  cpu=$(awk 'END { printf "%.2f", $3 + $4 }' "$work/time")
 }
 
 median() { sort -g | awk '{ v[NR] = $1 } END { print (NR % 2) ? v[(NR + 1) / 2] : (v[NR / 2] + v[NR / 2 + 1]) / 2 }'; }
 
-printf '\n%-13s %-8s %10s %18s %14s\n' workload tool 'median s' throughput 'peak RSS MB'
+printf '\n%-13s %-8s %8s %8s %18s %12s\n' workload tool 'wall s' 'cpu s' 'throughput' 'peak RSS MB'
 # bench NAME LABEL UNITS UNIT: times $work/NAME.ovm (ovmacro) against $work/NAME.m4 (m4 -P); the throughput
 # is UNITS per second (UNIT "MB": bytes, shown as MB/s).
 bench() {
-  local name=$1 label=$2 units=$3 unit=$4 i
-  local -a ov_wall=() m4_wall=() ov_rss=() m4_rss=()
+  local name=$1 label=$2 units=$3 unit=$4 i input_bytes
+  input_bytes=$(stat -c %s "$work/$name.ovm")
+  local -a ov_wall=() m4_wall=() ov_cpu=() m4_cpu=() ov_rss=() m4_rss=()
   run "$work/$name.ovmacro.out" "$ovmacro" "$work/$name.ovm"
   run "$work/$name.m4.out" m4 -P "$work/$name.m4"
   cmp -s "$work/$name.ovmacro.out" "$work/$name.m4.out" || {
@@ -146,21 +150,26 @@ bench() {
   }
   for ((i = 0; i < runs; i++)); do
     run "$work/$name.ovmacro.out" "$ovmacro" "$work/$name.ovm"
-    ov_wall+=("$wall") ov_rss+=("$rss")
+    ov_wall+=("$wall") ov_cpu+=("$cpu") ov_rss+=("$rss")
     run "$work/$name.m4.out" m4 -P "$work/$name.m4"
-    m4_wall+=("$wall") m4_rss+=("$rss")
+    m4_wall+=("$wall") m4_cpu+=("$cpu") m4_rss+=("$rss")
   done
-  local ovw m4w ovr m4r
+  local ovw m4w ovc m4c ovr m4r
   ovw=$(printf '%s\n' "${ov_wall[@]}" | median)
   m4w=$(printf '%s\n' "${m4_wall[@]}" | median)
+  ovc=$(printf '%s\n' "${ov_cpu[@]}" | median)
+  m4c=$(printf '%s\n' "${m4_cpu[@]}" | median)
   ovr=$(printf '%s\n' "${ov_rss[@]}" | sort -n | tail -n 1)
   m4r=$(printf '%s\n' "${m4_rss[@]}" | sort -n | tail -n 1)
-  awk -v name="$label" -v units="$units" -v unit="$unit" -v ovw="$ovw" -v m4w="$m4w" -v ovr="$ovr" -v m4r="$m4r" '
+  awk -v name="$label" -v units="$units" -v unit="$unit" -v ovw="$ovw" -v m4w="$m4w" -v ovc="$ovc" -v m4c="$m4c" \
+    -v ovr="$ovr" -v m4r="$m4r" -v bytes="$input_bytes" '
     function rate(t) { return unit == "MB" ? sprintf("%.1f MB/s", units / 1e6 / t) : sprintf("%.0f %s/s", units / t, unit) }
+    function times(a, b) { return b > 0 ? sprintf("%.2fx", a / b) : "-" }
     BEGIN {
-      printf "%-13s %-8s %10.3f %18s %14.1f\n", name, "ovmacro", ovw, rate(ovw), ovr / 1024
-      printf "%-13s %-8s %10.3f %18s %14.1f\n", "", "m4", m4w, rate(m4w), m4r / 1024
-      printf "%-13s %-8s %10s %18s %14s\n", "", "ratio", sprintf("%.2fx", ovw / m4w), "", sprintf("%.2fx", ovr / m4r)
+      printf "%-13s %-8s %8.3f %8.2f %18s %12.1f\n", name, "ovmacro", ovw, ovc, rate(ovw), ovr / 1024
+      printf "%-13s %-8s %8.3f %8.2f %18s %12.1f\n", "", "m4", m4w, m4c, rate(m4w), m4r / 1024
+      printf "%-13s %-8s %8s %8s %18s %12s\n", "", "speed-up", times(m4w, ovw), times(m4c, ovc), "", ""
+      printf "%-13s %-8s %8s %8s %18s %12s\n", "", "memory", "", "", "", sprintf("%.2fx input", ovr * 1024 / bytes)
     }'
 }
 
@@ -171,5 +180,6 @@ bench loop 'loop' "$items" items
 bench cond 'conditionals' "$lines" lines
 
 echo
-echo "median of $runs alternating runs per tool; peak RSS is the largest of those runs; ratio = ovmacro / m4;"
+echo "median of $runs alternating runs per tool; peak RSS is the largest of those runs; speed-up = m4 time / ovmacro"
+echo "time (wall and cpu = user + system); memory = ovmacro's peak RSS / its input's size;"
 echo "outputs of the two tools were identical for every workload; ovmacro $("$ovmacro" --version | awk '{ print $2 }'), $(m4 --version | head -n 1)"

@@ -3,8 +3,8 @@
 // expression, or evaluated by Python.
 #include <memory>
 #include <optional>
-#include <span>
 
+#include "ovmacro/expander/call_context.h"
 #include "ovmacro/expander/held_text.h"
 #include "ovmacro/expander/macro_expander.h"
 #include "ovmacro/expander/nesting_guard.h"
@@ -19,21 +19,6 @@
 namespace orvan {
 
 namespace {
-
-// "\n    invoking macro m(a,b) with a=x+1, b=y"
-basic_xstring InvokingMacroLine(const LSMacroVariable& m, std::span<LSVariable* const> bound) {
-    StringStream ss;
-    ss << "\n    invoking macro " << m;
-    if (!bound.empty()) {
-        ss << " with ";
-        for (size_t i = 0; i < bound.size(); ++i) {
-            if (i) ss << ", ";
-            ss << bound[i]->GetName() << "=";
-            bound[i]->WriteValue(ss);
-        }
-    }
-    return ss.GetString();
-}
 
 // Whether a macro's body is all ordinary text (see SkipPlainText), so that its expansion is the body itself.
 bool IsPlainText(const LSMacroVariable& m, const VarFrame* bodyParent) {
@@ -88,6 +73,7 @@ void MacroExpander::InvokeVariable(LSVariable* v) {
         MacroNestingGuard::ChargeOutput(output->GetCharCount() - before, body.begin());
         return;
     }
+    if (n > 0 && ExpandPlainBody(*m, parentFrame, actual.view())) return;
     std::optional<VarFrame> ownFrame;
     VarFrame* bodyFrame = frame;
     if (!m->IsNaked()) bodyFrame = &ownFrame.emplace(parentFrame);
@@ -140,7 +126,8 @@ void MacroExpander::InvokeVariable(LSVariable* v) {
             WriteCalculatedSubString(BasicSubString(value));
         }
     } catch (LexScannerException& e) {
-        e.AppendCallContextLine(InvokingMacroLine(*m, bound.view()));
+        e.AppendCallContextLine(
+            InvokingMacroLine(*m, bound.size(), [&](xostream& os, size_t i) { bound[i]->WriteValue(os); }));
         throw;
     }
 }

@@ -14,6 +14,7 @@
 #pragma once
 
 #include <cstdint>
+#include <span>
 
 #include "ovmacro/expander/import_handler.h"
 #include "ovmacro/lexer/token.h"
@@ -80,6 +81,9 @@ private:
     // Invocation.
     void InvokeVariable(LSVariable* v);
     void InvokeMacroFunction(LSMacroVariable* m);
+    // Expands a call whose body is ordinary text apart from the names of untyped arguments; false, having
+    // written nothing, for any other macro.
+    bool ExpandPlainBody(const LSMacroVariable& m, VarFrame* parentFrame, std::span<const BasicSubString> actual);
     basic_xstring EvaluateString(BasicSubString text, BasicSubString directiveName);
     // Conditionals and loops.
     void ProcessIfDirective();

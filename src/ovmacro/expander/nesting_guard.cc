@@ -76,9 +76,10 @@ void MacroNestingGuard::SetDepthLimitForTesting(int64 limit) { t_depthLimit = li
 void MacroNestingGuard::SetWorkLimitsForTesting(int64 expansions, int64 outputChars) {
     t_expansionLimit = expansions;
     t_outputLimit = outputChars;
+    if (outputChars != kNoWorkLimit) s_workLimitsSet.store(true, std::memory_order_relaxed);
 }
 
-void MacroNestingGuard::ChargeOutput(int64 chars, const char* position) {
+void MacroNestingGuard::ChargeBoundedOutput(int64 chars, const char* position) {
     if (t_outputLimit == kNoWorkLimit) return;
     t_outputChars += chars;
     if (t_outputChars > t_outputLimit)

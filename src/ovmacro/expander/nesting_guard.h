@@ -9,6 +9,8 @@
 // lower them (SetWorkLimitsForTesting) so that every run of a short text ends quickly.
 #pragma once
 
+#include <atomic>
+
 #include "ovmacro/foundations/types.h"
 
 namespace orvan {
@@ -39,9 +41,14 @@ public:
     // expansion stops with "Expansion work limit reached ...". kNoWorkLimit lifts a bound.
     static void SetWorkLimitsForTesting(int64 expansions, int64 outputChars);
     // Counts characters written by the running expansion; raises at position past the output bound.
-    static void ChargeOutput(int64 chars, const char* position);
+    static void ChargeOutput(int64 chars, const char* position) {
+        if (s_workLimitsSet.load(std::memory_order_relaxed)) ChargeBoundedOutput(chars, position);
+    }
 
 private:
+    static void ChargeBoundedOutput(int64 chars, const char* position);
+    // Whether any thread has ever set work limits: output is counted only then.
+    static inline std::atomic<bool> s_workLimitsSet{false};
     bool outermost_;
 };
 

@@ -94,7 +94,10 @@ public:
     void clear() { text_.clear(); }
 
 protected:
-    void DoWrite(const char* p, size_t n) override { text_.append(p, n); }
+    void DoWrite(const char* p, size_t n) override {
+        if (text_.size() + n > text_.capacity()) ReserveLargeBuffer(text_, text_.size() + n);
+        text_.append(p, n);
+    }
 
 private:
     basic_xstring text_;

@@ -5,6 +5,7 @@
 // calculated piece with a null source). The pieces tile the output in order, without gaps.
 #pragma once
 
+#include "ovmacro/foundations/large_buffers.h"
 #include "ovmacro/foundations/sub_string.h"
 #include "ovmacro/foundations/types.h"
 #include "ovmacro/lexer/exceptions.h"
@@ -34,6 +35,7 @@ public:
                 return;
             }
         }
+        if (pieces_.size() == pieces_.capacity()) ReserveLargeBuffer(pieces_, pieces_.size() + 1);
         pieces_.push_back(p);
         total_ += p.size();
     }
