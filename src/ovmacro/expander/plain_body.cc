@@ -2,6 +2,8 @@
 // is written as it stands and each name is replaced by the expansion of its argument, without the frame,
 // bindings and nested expander that the general way builds. The output, its pieces, the nesting count and
 // every error report are the same as the general way's.
+#include <cstdint>
+
 #include "ovmacro/expander/call_context.h"
 #include "ovmacro/expander/held_text.h"
 #include "ovmacro/expander/macro_expander.h"
@@ -24,16 +26,9 @@ struct ArgumentUse {
 // Bodies with more uses than this take the general way.
 constexpr int64 kMaxPlainBodyUses = 16;
 
-// The formal argument a name in the body refers to: the last of that name, which hides earlier ones.
-int64 FindFormal(const LSMacroVariable& m, BasicSubString name) {
-    for (int64 i = m.GetNumArgs() - 1; i >= 0; --i)
-        if (m.GetArg(i).name == name) return i;
-    return -1;
-}
-
 // Splits the body into ordinary text and argument names; false when anything else is in it (another name
 // that may be a variable, a directive, a line feed whose indentation must go, a text the scanner rejects).
-bool SplitPlainBody(const LSMacroVariable& m, bool dollarMacrosActive, ArgumentUse* uses, int64& count) {
+bool ScanPlainBody(const LSMacroVariable& m, bool dollarMacrosActive, ArgumentUse* uses, int64& count) {
     const BasicSubString body = m.GetSubstitutionString();
     count = 0;
     for (const char* p = body.begin();;) {
@@ -45,12 +40,73 @@ bool SplitPlainBody(const LSMacroVariable& m, bool dollarMacrosActive, ArgumentU
         }
         if (run.stop == body.end()) return true;
         if (!run.nameEnd || count == kMaxPlainBodyUses) return false;
-        const int64 arg = FindFormal(m, BasicSubString(run.stop, run.nameEnd));
+        const int64 arg = m.FindArgName(BasicSubString(run.stop, run.nameEnd));
         if (arg < 0) return false;
         uses[count++] = {run.stop, run.nameEnd, arg};
         p = run.nameEnd;
     }
 }
+
+// The splits of the bodies a thread invoked last. A split depends on the body's text, the names of the
+// formal arguments, the two flags that SkipPlainText takes, and the name filter; entries are matched by
+// content, since a text may be freed and another written at its address.
+class PlainBodySplits {
+public:
+    bool Split(const LSMacroVariable& m, bool dollarMacrosActive, ArgumentUse* uses, int64& count) {
+        const BasicSubString body = m.GetSubstitutionString();
+        const bool indented = m.GetIndent() > 0;
+        const std::uint64_t generation = NameFilter::Generation();
+        for (Entry& e : entries_) {
+            if (!e.Matches(m, body, indented, dollarMacrosActive, generation)) continue;
+            count = e.count;
+            for (int64 u = 0; u < count; ++u)
+                uses[u] = {body.begin() + e.uses[u].begin, body.begin() + e.uses[u].end, e.uses[u].arg};
+            return e.plain;
+        }
+        Entry& e = entries_[next_];
+        next_ = (next_ + 1) % kEntries;
+        e.plain = ScanPlainBody(m, dollarMacrosActive, uses, count);
+        e.body.assign(body.view());
+        e.formals.clear();
+        for (int64 i = 0; i < m.GetNumArgs(); ++i) e.formals.emplace_back(m.GetArg(i).name.view());
+        e.indented = indented;
+        e.dollarMacrosActive = dollarMacrosActive;
+        e.generation = generation;
+        e.count = e.plain ? count : 0;
+        for (int64 u = 0; u < e.count; ++u)
+            e.uses[u] = {uses[u].begin - body.begin(), uses[u].end - body.begin(), uses[u].arg};
+        return e.plain;
+    }
+
+private:
+    struct Use {
+        int64 begin, end, arg;  // offsets in the body
+    };
+    struct Entry {
+        bool Matches(const LSMacroVariable& m, BasicSubString text, bool indentedNow, bool dollarNow,
+                     std::uint64_t generationNow) const {
+            if (generation != generationNow || indented != indentedNow || dollarMacrosActive != dollarNow)
+                return false;
+            if (formals.size() != static_cast<size_t>(m.GetNumArgs()) || body != text.view()) return false;
+            for (size_t i = 0; i < formals.size(); ++i)
+                if (formals[i] != m.GetArg(static_cast<int64>(i)).name.view()) return false;
+            return true;
+        }
+        std::uint64_t generation = ~std::uint64_t{0};
+        bool indented = false;
+        bool dollarMacrosActive = false;
+        bool plain = false;
+        basic_xstring body;
+        xvector<basic_xstring> formals;
+        int64 count = 0;
+        Use uses[kMaxPlainBodyUses];
+    };
+    static constexpr size_t kEntries = 4;
+    Entry entries_[kEntries];
+    size_t next_ = 0;
+};
+
+thread_local PlainBodySplits t_splits;
 
 // Whether an argument expands to itself in `frame`: ordinary text, and names that no variable there has.
 // Whatever would raise an error (a lookup, the scanner) leaves it to the expansion, which reports it.
@@ -87,7 +143,7 @@ bool MacroExpander::ExpandPlainBody(const LSMacroVariable& m, VarFrame* parentFr
     };
     ArgumentUse uses[kMaxPlainBodyUses];
     int64 count = 0;
-    if (!SplitPlainBody(m, dollarMacrosActive(bodyScope), uses, count)) return false;
+    if (!t_splits.Split(m, dollarMacrosActive(bodyScope), uses, count)) return false;
 
     const BasicSubString body = m.GetSubstitutionString();
     const int64 bodyIndent = GetOutputPos();

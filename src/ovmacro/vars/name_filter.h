@@ -17,8 +17,13 @@ class NameFilter {
 public:
     static void Add(BasicSubString name) {
         const std::uint32_t h = Hash(name);
-        bits_[h >> 6].fetch_or(std::uint64_t{1} << (h & 63), std::memory_order_relaxed);
+        const std::uint64_t bit = std::uint64_t{1} << (h & 63);
+        if ((bits_[h >> 6].fetch_or(bit, std::memory_order_relaxed) & bit) == 0)
+            generation_.fetch_add(1, std::memory_order_release);
     }
+    // Changes whenever a bit is set: what was learnt from the filter under one generation holds while the
+    // generation stays the same.
+    static std::uint64_t Generation() { return generation_.load(std::memory_order_acquire); }
     static bool MayContain(BasicSubString name) {
         const std::uint32_t h = Hash(name);
         return (bits_[h >> 6].load(std::memory_order_relaxed) >> (h & 63)) & 1;
@@ -45,6 +50,7 @@ private:
                std::uint32_t{p[3]} << 24;
     }
     static std::atomic<std::uint64_t> bits_[kBits / 64];
+    static inline std::atomic<std::uint64_t> generation_{0};
 };
 
 }  // namespace orvan
