@@ -103,6 +103,9 @@ int main(int argc, char** argv) {
     MpfwFrame frame(files);
     FileHost host(frame, options.includeDirs);
     host.SetDiagnosticStyle(options.diagnostics);
+    // The map from the expansion back to the sources serves the settings (their errors), line markers and
+    // source maps; without them it is not kept.
+    host.SetKeepOutputPieces(options.settings || options.lineMarkers || !options.sourceMapPath.empty());
 
     if (!options.defines.empty() &&
         host.LoadText("<command line>", DefinitionsText(options)) != FileHost::Load::kOk)

@@ -24,7 +24,7 @@ void MacroExpand(ImportHandler* importHandler, VarFrame* frame, BasicSubString t
                  int64 outputIndent, basic_xstring& result) {
     // The expansion of a text is usually about as long as the text: reserve that much at once.
     StringStream stream(static_cast<size_t>(text.size()) + 16);
-    ExpandedOutput output(&stream);
+    ExpandedOutput output(&stream, false);  // nobody asks for the pieces
     MacroExpand(importHandler, frame, text, inputIndent, outputIndent, output);
     stream.GetString(result, true);
 }

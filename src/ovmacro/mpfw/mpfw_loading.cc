@@ -48,8 +48,11 @@ MpfwSourceFile* MpfwParser::AddFileWithText(const basic_xstring& name, basic_xst
 
     ExpansionChainEntry entry(expanding_, name);
     try {
-        MacroExpand(this, &mpfwFrame->varFrame, BasicSubString(file->text), 0, 0, file->expandedText,
-                    file->pieces);
+        if (keepOutputPieces_)
+            MacroExpand(this, &mpfwFrame->varFrame, BasicSubString(file->text), 0, 0, file->expandedText,
+                        file->pieces);
+        else
+            MacroExpand(this, &mpfwFrame->varFrame, BasicSubString(file->text), 0, 0, file->expandedText);
     } catch (LexScannerException& e) {
         // An imported file's expansion is not the outermost one, which would otherwise count the context
         // lines left out; the report is written here, so count them here.

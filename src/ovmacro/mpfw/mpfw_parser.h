@@ -44,6 +44,10 @@ public:
     // The same for a text that the host already holds (standard input, text made by the host), recorded
     // under `name`.
     MpfwSourceFile* AddFileWithText(const basic_xstring& name, basic_xstring text);
+    // Whether the files loaded from now on keep the output pieces of their expansions (they do by default).
+    // A host that only writes the expanded texts, and neither reads settings from them nor maps their
+    // positions back, saves the pieces' memory: a few pieces for every macro call.
+    void SetKeepOutputPieces(bool keep) { keepOutputPieces_ = keep; }
 
     // A directory in which later imports may be searched: dollar macros applied, normalised, appended to
     // the frame's import paths.
@@ -105,6 +109,7 @@ private:
     bool ApplyMacrosAt(basic_xstring& text, const char* pos);
 
     xvector<basic_xstring> expanding_;
+    bool keepOutputPieces_ = true;
 };
 
 }  // namespace orvan

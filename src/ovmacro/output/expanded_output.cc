@@ -64,16 +64,16 @@ void ExpandedOutput::WriteSubStringFromSourceFile(BasicSubString s, int64 indent
         if (p == end) return;
         if (column_ < 0) column_ = 0;
         WriteRun(p, end - p);
-        pieces_.push_back(OutputPiece(s, 0));
+        AddPiece(OutputPiece(s, 0));
         return;
     }
     while (p < end) {
-        if (StartLine(indent)) pieces_.push_back(OutputPiece(BasicSubString(), indent));
+        if (StartLine(indent)) AddPiece(OutputPiece(BasicSubString(), indent));
         // Up to and including the next line feed: the line after it gets its indentation first.
         const char* lf = static_cast<const char*>(std::memchr(p, '\n', static_cast<size_t>(end - p)));
         const char* runEnd = lf ? lf + 1 : end;
         WriteRun(p, runEnd - p);
-        pieces_.push_back(OutputPiece(BasicSubString(p, runEnd), 0));
+        AddPiece(OutputPiece(BasicSubString(p, runEnd), 0));
         p = runEnd;
     }
 }
@@ -91,7 +91,7 @@ void ExpandedOutput::WriteCalculatedSubString(BasicSubString s, BasicSubString s
         WriteRun(p, runEnd - p);
         p = runEnd;
     }
-    pieces_.push_back(OutputPiece(source, n));
+    AddPiece(OutputPiece(source, n));
 }
 
 }  // namespace orvan

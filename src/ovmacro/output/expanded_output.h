@@ -12,7 +12,9 @@ namespace orvan {
 
 class ExpandedOutput {
 public:
-    explicit ExpandedOutput(xostream* stream) : stream_(stream) {}
+    // Without `recordPieces` no pieces are kept (Pieces() stays empty), for hosts that want only the text.
+    explicit ExpandedOutput(xostream* stream, bool recordPieces = true)
+        : stream_(stream), recordPieces_(recordPieces) {}
 
     // Copied text: each character maps back to itself in the source. Lines it begins get `indent` blanks.
     void WriteSubStringFromSourceFile(BasicSubString s, int64 indent);
@@ -34,8 +36,12 @@ private:
     bool StartLine(int64 indent);
     // Writes a run that holds no line start needing indentation, and advances the column.
     void WriteRun(const char* p, int64 n);
+    void AddPiece(const OutputPiece& p) {
+        if (recordPieces_) pieces_.push_back(p);
+    }
 
     xostream* stream_;
+    bool recordPieces_;
     int64 column_ = -1;
     OutputPieces pieces_;
     int64 charCount_ = 0;
