@@ -9,20 +9,14 @@
 namespace orvan {
 namespace {
 
+using testing::ExpandText;
 using testing::MessageOf;
+using testing::OffsetIn;
 
 class NoImports : public ImportHandler {
 public:
     bool HandleImport(VarFrame*, const basic_xstring&, const char*) override { return false; }
 };
-
-// Names defined by the text are views into it, so the text outlives the frame here.
-std::string Expand(const std::string& text, ImportHandler* handler = nullptr) {
-    FileScopeVarFrame frame;
-    std::string result;
-    MacroExpand(handler, &frame, BasicSubString(text), 0, 0, result);
-    return result;
-}
 
 struct PassCase {
     const char* name;
@@ -47,7 +41,7 @@ TEST(AssertionDirectives, PassingAssertionsLeaveNoTrace) {
     NoImports handler;
     for (const PassCase& c : cases) {
         SCOPED_TRACE(c.name);
-        EXPECT_EQ(Expand(c.input, &handler), c.expected);
+        EXPECT_EQ(ExpandText(c.input, &handler), c.expected);
     }
 }
 
@@ -58,11 +52,6 @@ TEST(AssertionDirectives, AssertFailsWithoutFileScopeSeesTheSameFailures) {
     std::string out;
     MacroExpand(nullptr, &root, BasicSubString(text), 0, 0, out);
     EXPECT_EQ(out, "ok");
-}
-
-// Offset of an error position in the text, or -1 when the error has no position.
-long PositionIn(const std::string& text, const char* position) {
-    return position ? static_cast<long>(position - text.data()) : -1L;
 }
 
 struct FailureCase {
@@ -105,8 +94,8 @@ TEST(AssertionDirectives, Failures) {
         SCOPED_TRACE(c.name);
         const std::string input = c.input;
         const char* position = nullptr;
-        EXPECT_EQ(MessageOf([&] { Expand(input, &handler); }, position), c.message);
-        EXPECT_EQ(PositionIn(input, position), c.position);
+        EXPECT_EQ(MessageOf([&] { ExpandText(input, &handler); }, position), c.message);
+        EXPECT_EQ(OffsetIn(input, position), c.position);
     }
 }
 

@@ -9,21 +9,15 @@
 namespace orvan {
 namespace {
 
+using testing::ExpandText;
 using testing::MessageOf;
+using testing::OffsetIn;
 
 // Dollar definitions are directives only for an expansion that has an import handler.
 class NoImports : public ImportHandler {
 public:
     bool HandleImport(VarFrame*, const basic_xstring&, const char*) override { return false; }
 };
-
-// Names defined by the text are views into it, so the text outlives the frame here.
-std::string Expand(const std::string& text, ImportHandler* handler = nullptr) {
-    FileScopeVarFrame frame;
-    std::string result;
-    MacroExpand(handler, &frame, BasicSubString(text), 0, 0, result);
-    return result;
-}
 
 struct LayoutCase {
     const char* name;
@@ -45,7 +39,7 @@ TEST(AssignmentDirectives, LetStoresCanonicalValues) {
     };
     for (const LayoutCase& c : cases) {
         SCOPED_TRACE(c.name);
-        EXPECT_EQ(Expand(c.input), c.expected);
+        EXPECT_EQ(ExpandText(c.input), c.expected);
     }
 }
 
@@ -72,9 +66,9 @@ TEST(AssignmentDirectives, LayoutAndFrames) {
     };
     for (const LayoutCase& c : cases) {
         SCOPED_TRACE(c.name);
-        EXPECT_EQ(Expand(c.input, &handler), c.expected);
+        EXPECT_EQ(ExpandText(c.input, &handler), c.expected);
     }
-    EXPECT_EQ(Expand("@$N = \"v\""), "@$N = \"v\"") << "without an import handler @$ is no directive";
+    EXPECT_EQ(ExpandText("@$N = \"v\""), "@$N = \"v\"") << "without an import handler @$ is no directive";
 }
 
 TEST(AssignmentDirectives, FailedLetChangesNothing) {
@@ -93,11 +87,6 @@ TEST(AssignmentDirectives, FailedLetChangesNothing) {
     MacroExpand(nullptr, &frame, BasicSubString(use), 0, 0, out);
     EXPECT_EQ(out, "4 ok");
     EXPECT_EQ(frame.Find(BasicSubString("m"), nullptr), nullptr);
-}
-
-// Offset of an error position in the text, or -1 when the error has no position.
-long PositionIn(const std::string& text, const char* position) {
-    return position ? static_cast<long>(position - text.data()) : -1L;
 }
 
 struct FailureCase {
@@ -137,9 +126,9 @@ TEST(AssignmentDirectives, Failures) {
         SCOPED_TRACE(c.name);
         const std::string input = c.input;
         const char* position = nullptr;
-        EXPECT_EQ(MessageOf([&] { Expand(input, &handler); }, position), c.message);
+        EXPECT_EQ(MessageOf([&] { ExpandText(input, &handler); }, position), c.message);
         if (c.position >= 0) {
-            EXPECT_EQ(PositionIn(input, position), c.position);
+            EXPECT_EQ(OffsetIn(input, position), c.position);
         }
     }
 }

@@ -108,13 +108,7 @@ TEST(ConditionalsTest, ErrorsWithContextAndPosition) {
         {"@else {b}", "@else with no matching @if directive", "else"},
         {"@if(false){a}\ntext @else{b}", "@else with no matching @if directive", "else"},
     };
-    for (const auto& c : cases) {
-        SCOPED_TRACE(c.input);
-        const std::string text = c.input;
-        const char* position = nullptr;
-        EXPECT_EQ(MessageOf([&] { Expand(text); }, position), c.message);
-        EXPECT_EQ(OffsetIn(text, position), OffsetOf(text, c.at));
-    }
+    for (const auto& c : cases) testing::ExpectErrorAt(c.input, c.message, c.at);
 }
 
 // A failing condition writes nothing of the construct; what came before it stays.

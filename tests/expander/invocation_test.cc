@@ -13,18 +13,12 @@
 namespace orvan {
 namespace {
 
-using orvan::testing::MessageOf;
-using orvan::testing::kAtEnd;
 using orvan::testing::ExpandIn;
+using orvan::testing::ExpandText;
+using orvan::testing::ExpectErrorAt;
+using orvan::testing::kAtEnd;
+using orvan::testing::MessageOf;
 using orvan::testing::OffsetIn;
-
-int64 OffsetOf(const std::string& text, const char* marker) { return testing::OffsetOf(text, marker, true); }
-
-
-std::string Expand(const std::string& text) {
-    FileScopeVarFrame frame;
-    return ExpandIn(frame, text);
-}
 
 // ---------------------------------------------------------------------------------------------------------
 // Value variables.
@@ -103,7 +97,7 @@ TEST(InvocationTest, Expansions) {
     };
     for (const auto& c : cases) {
         SCOPED_TRACE(c.input);
-        EXPECT_EQ(Expand(c.input), c.output);
+        EXPECT_EQ(ExpandText(c.input), c.output);
     }
 }
 
@@ -163,13 +157,7 @@ TEST(InvocationErrorsTest, MessagesAndPositions) {
          "    invoking macro n(i) with i=1",
          "@if"},
     };
-    for (const auto& c : cases) {
-        SCOPED_TRACE(c.input);
-        const std::string text = c.input;
-        const char* position = nullptr;
-        EXPECT_EQ(MessageOf([&] { Expand(text); }, position), c.message);
-        EXPECT_EQ(OffsetIn(text, position), OffsetOf(text, c.at));
-    }
+    for (const auto& c : cases) ExpectErrorAt(c.input, c.message, c.at, /*last=*/true);
 }
 
 // Errors found while evaluating a typed argument or a typed macro's body: the expression that was evaluated
@@ -200,13 +188,7 @@ TEST(InvocationErrorsTest, TypedEvaluationErrorsArePlacedInTheSource) {
          "apply(f) with f=g",
          "f(1)"},
     };
-    for (const auto& c : cases) {
-        SCOPED_TRACE(c.input);
-        const std::string text = c.input;
-        const char* position = nullptr;
-        EXPECT_EQ(MessageOf([&] { Expand(text); }, position), c.message);
-        EXPECT_EQ(OffsetIn(text, position), OffsetOf(text, c.at));
-    }
+    for (const auto& c : cases) ExpectErrorAt(c.input, c.message, c.at, /*last=*/true);
 }
 
 // What a body wrote before its error stays in the output; the rest of the call is not written.

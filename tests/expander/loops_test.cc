@@ -13,14 +13,10 @@
 namespace orvan {
 namespace {
 
-using orvan::testing::MessageOf;
+using orvan::testing::ExpandText;
+using orvan::testing::ExpectErrorAt;
 using orvan::testing::kAtEnd;
-using orvan::testing::ExpandIn;
-using orvan::testing::OffsetIn;
-
-int64 OffsetOf(const std::string& text, const char* marker) { return testing::OffsetOf(text, marker); }
-
-std::string Expand(const std::string& text) { return testing::ExpandText(text); }
+using orvan::testing::MessageOf;
 
 TEST(ForLoopTest, Iterations) {
     const struct {
@@ -61,7 +57,7 @@ TEST(ForLoopTest, Iterations) {
     };
     for (const auto& c : cases) {
         SCOPED_TRACE(c.input);
-        EXPECT_EQ(Expand(c.input), c.output);
+        EXPECT_EQ(ExpandText(c.input), c.output);
     }
 }
 
@@ -86,7 +82,7 @@ TEST(WhileLoopTest, Iterations) {
     };
     for (const auto& c : cases) {
         SCOPED_TRACE(c.input);
-        EXPECT_EQ(Expand(c.input), c.output);
+        EXPECT_EQ(ExpandText(c.input), c.output);
     }
 }
 
@@ -141,13 +137,7 @@ TEST(LoopErrorsTest, MessagesContextsAndPositions) {
         // Errors in the block pass through unchanged.
         {"@while(true){@if(1){}}", "No implicit conversion from int64 to bool\n    in @if(1)", "@if"},
     };
-    for (const auto& c : cases) {
-        SCOPED_TRACE(c.input);
-        const std::string text = c.input;
-        const char* position = nullptr;
-        EXPECT_EQ(MessageOf([&] { Expand(text); }, position), c.message);
-        EXPECT_EQ(OffsetIn(text, position), OffsetOf(text, c.at));
-    }
+    for (const auto& c : cases) ExpectErrorAt(c.input, c.message, c.at);
 }
 
 // Iterations that ran before an error keep their output.

@@ -9,15 +9,9 @@
 namespace orvan {
 namespace {
 
+using testing::ExpandText;
 using testing::MessageOf;
-
-// Names defined by the text are views into it, so the text outlives the frame here.
-std::string Expand(const std::string& text) {
-    FileScopeVarFrame frame;
-    std::string result;
-    MacroExpand(nullptr, &frame, BasicSubString(text), 0, 0, result);
-    return result;
-}
+using testing::OffsetIn;
 
 struct LayoutCase {
     const char* name;
@@ -59,7 +53,7 @@ TEST(StringDirectives, OutputLayout) {
     };
     for (const LayoutCase& c : cases) {
         SCOPED_TRACE(c.name);
-        EXPECT_EQ(Expand(c.input), c.expected);
+        EXPECT_EQ(ExpandText(c.input), c.expected);
     }
 }
 
@@ -74,11 +68,6 @@ TEST(StringDirectives, DefinitionsExportedFromTheSecondPassOfSquareBracketsStayV
     MacroExpand(nullptr, &frame, BasicSubString(use), 0, 0, second);
     EXPECT_EQ(first, "");
     EXPECT_EQ(second, "kept, also kept");
-}
-
-// Offset of an error position in the text, or -1 when the error has no position.
-long PositionIn(const std::string& text, const char* position) {
-    return position ? static_cast<long>(position - text.data()) : -1L;
 }
 
 struct FailureCase {
@@ -113,8 +102,8 @@ TEST(StringDirectives, Failures) {
         SCOPED_TRACE(c.name);
         const std::string input = c.input;
         const char* position = nullptr;
-        EXPECT_EQ(MessageOf([&] { Expand(input); }, position), c.message);
-        EXPECT_EQ(PositionIn(input, position), c.position);
+        EXPECT_EQ(MessageOf([&] { ExpandText(input); }, position), c.message);
+        EXPECT_EQ(OffsetIn(input, position), c.position);
     }
 }
 

@@ -63,7 +63,6 @@ TEST(ScanArgumentTest, TokenAndBackquotedForms) {
         EToken ended;
         const char* rest;
     } cases[] = {
-        {"a, b)", TK_RPAREN, "a", TK_COMMA, " b)"},
         {"f(x, y), z", TK_RPAREN, "f(x, y)", TK_COMMA, " z"},
         {"`a,b`)", TK_RPAREN, "a,b", TK_RPAREN, ""},
         {"\")\", x)", TK_RPAREN, "\")\"", TK_COMMA, " x)"},
@@ -99,12 +98,86 @@ TEST(ScanArgumentTest, TokenAndBackquotedForms) {
     }
 }
 
+// An argument that is one name followed by white space and a comma or the terminator is read without tokens;
+// everything else, including a name followed by anything else, is read token by token. Both ways must agree
+// on the argument, the token that ended it and what is left.
+TEST(ScanArgumentTest, SingleNamesReadLikeAnyOtherArgument) {
+    const struct {
+        const char* input;
+        EToken terminator;
+        const char* arg;
+        EToken ended;
+        int64 endedAt;  // offset of the one-character token that ended the argument
+        const char* rest;
+    } cases[] = {
+        {"a, b)", TK_RPAREN, "a", TK_COMMA, 1, " b)"},
+        {"abc  )", TK_RPAREN, "abc", TK_RPAREN, 5, ""},
+        {"abc \t]", TK_RBRACKET, "abc", TK_RBRACKET, 5, ""},
+        {"a\n,", TK_RPAREN, "a", TK_COMMA, 2, ""},
+        {"a\r\n\v\f, x", TK_RBRACKET, "a", TK_COMMA, 5, " x"},
+        {"_x9 ,", TK_RPAREN, "_x9", TK_COMMA, 4, ""},
+        {"  \xC3\xA9t\xC3\xA9 ) z", TK_RPAREN, "\xC3\xA9t\xC3\xA9", TK_RPAREN, 8, " z"},
+        {"r)", TK_RPAREN, "r", TK_RPAREN, 1, ""},
+        {"a]", TK_RBRACKET, "a", TK_RBRACKET, 1, ""},
+        // A raw literal's prefix is no name.
+        {"r\"x\")", TK_RPAREN, "r\"x\"", TK_RPAREN, 4, ""},
+        {"R'x', y]", TK_RBRACKET, "R'x'", TK_COMMA, 4, " y]"},
+        // Whatever follows the name other than white space and the ending token makes it a longer argument.
+        {"a b)", TK_RPAREN, "a b", TK_RPAREN, 3, ""},
+        {"a(b), c)", TK_RPAREN, "a(b)", TK_COMMA, 4, " c)"},
+        {"a.b, c", TK_RPAREN, "a.b", TK_COMMA, 3, " c"},
+        {"a) ]", TK_RBRACKET, "a)", TK_RBRACKET, 3, ""},
+        {"a) ;", TK_SEMICOLON, "a)", TK_SEMICOLON, 3, ""},
+        // Comments between the name and the ending token are not part of the argument.
+        {"a/*c*/,", TK_RPAREN, "a", TK_COMMA, 6, ""},
+        {"a // c\n]", TK_RBRACKET, "a", TK_RBRACKET, 7, ""},
+    };
+    for (const auto& c : cases) {
+        SCOPED_TRACE(::testing::PrintToString(std::string(c.input)));
+        const ExactBuffer buf(c.input);
+        BasicSubString s = buf.view();
+        BasicSubString arg;
+        const LSToken ended = ScanArgument(s, arg, c.terminator);
+        EXPECT_EQ(Str(arg), c.arg);
+        EXPECT_EQ(ended.GetType(), c.ended);
+        EXPECT_EQ(buf.Offset(ended.text.begin()), c.endedAt);
+        EXPECT_EQ(ended.text.view().size(), 1u);
+        EXPECT_EQ(Str(s), c.rest);
+    }
+
+    // A name that is not followed by a comma or this terminator reads on to the end.
+    const struct {
+        const char* input;
+        EToken terminator;
+        const char* message;
+        int64 offset;
+    } errors[] = {
+        {"a", TK_RPAREN, "Met EOS while reading argument a", 1},
+        {" r", TK_RBRACKET, "Met EOS while reading argument r", 2},
+        {"a  ", TK_RPAREN, "Met EOS while reading argument a  ", 3},
+        {"a]", TK_RPAREN, "Met EOS while reading argument a]", 2},
+        {"a)", TK_RBRACKET, "Met EOS while reading argument a)", 2},
+        {"abc  )", TK_RBRACKET, "Met EOS while reading argument abc  )", 6},
+        {"a b)", TK_RBRACKET, "Met EOS while reading argument a b)", 4},
+        {"r\"x\")", TK_RBRACKET, "Met EOS while reading argument r\"x\")", 5},
+        {"r\"x)", TK_RPAREN, "Met EOS within double quoted string after reading r\"x)", 4},
+    };
+    for (const auto& e : errors) {
+        ExpectError(
+            e.input,
+            [&](BasicSubString& s) {
+                BasicSubString arg;
+                ScanArgument(s, arg, e.terminator);
+            },
+            e.message, e.offset);
+    }
+}
+
 TEST(ScanArgumentTest, Errors) {
     const auto scan = [](BasicSubString& s) {
         BasicSubString arg;
         ScanArgument(s, arg, TK_RPAREN);
     };
-    ExpectError("abc", scan, "Met EOS while reading argument abc", 3);
     ExpectError("  (a, b", scan, "Met EOS while reading argument (a, b", 7);
     ExpectError("(a)", scan, "Met EOS while reading argument (a)", 3);
     ExpectError("  ", scan, "Met EOS while reading argument ", 2);

@@ -153,6 +153,25 @@ TEST(MpfwLoading, AddFileWithTextRecordsTheTextUnderTheName) {
     EXPECT_EQ(f->expandedText, "@import \"a.ovp\"\nfrom a\n");
 }
 
+// Without pieces the texts are the same, imports included, and no file keeps a map.
+TEST(MpfwLoading, FilesLoadedWithoutPiecesKeepTheSameTexts) {
+    TempDir dir;
+    dir.Write("a.ovp", "@def m(x) = {from x}\nm(a)\n");
+    const std::string text = "@import \"a.ovp\"\n  m(b) m(`c, d`)\n";
+    Loader with(dir), without(dir);
+    without.host.SetKeepOutputPieces(false);
+    MpfwSourceFile* kept = with.host.AddFileWithText("<memory>", text);
+    MpfwSourceFile* bare = without.host.AddFileWithText("<memory>", text);
+    ASSERT_NE(kept, nullptr);
+    ASSERT_NE(bare, nullptr);
+    EXPECT_EQ(bare->expandedText, kept->expandedText);
+    EXPECT_EQ(kept->pieces.size(), static_cast<int64>(kept->expandedText.size()));
+    for (int64 i = 0; i < without.files.size(); ++i) {
+        EXPECT_EQ(without.files[i]->expandedText, with.files[i]->expandedText);
+        EXPECT_TRUE(without.files[i]->pieces.GetPieces().empty());
+    }
+}
+
 TEST(MpfwLoading, ImportPathsAreReplacedNormalisedAndKeptInOrder) {
     TempDir dir;
     dir.Write("root.ovp", "@$D = \"inc\"\n@importpath \"$(D)/x/../y/\"\n@importpath(\"other\")\n");

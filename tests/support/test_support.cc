@@ -132,15 +132,22 @@ int64 OffsetIn(const std::string& text, const char* p) {
     return static_cast<int64>(pos - begin);
 }
 
-std::string ExpandIn(VarFrame& frame, const std::string& text) {
+std::string ExpandIn(VarFrame& frame, const std::string& text, ImportHandler* handler) {
     std::string out;
-    MacroExpand(nullptr, &frame, BasicSubString(text), 0, 0, out);
+    MacroExpand(handler, &frame, BasicSubString(text), 0, 0, out);
     return out;
 }
 
-std::string ExpandText(const std::string& text) {
+std::string ExpandText(const std::string& text, ImportHandler* handler) {
     FileScopeVarFrame frame;
-    return ExpandIn(frame, text);
+    return ExpandIn(frame, text, handler);
+}
+
+void ExpectErrorAt(const std::string& text, const std::string& message, const char* at, bool last) {
+    SCOPED_TRACE(::testing::PrintToString(text));
+    const char* position = nullptr;
+    EXPECT_EQ(MessageOf([&] { ExpandText(text); }, position), message);
+    EXPECT_EQ(OffsetIn(text, position), OffsetOf(text, at, last));
 }
 
 }  // namespace orvan::testing

@@ -6,6 +6,7 @@
 #include <string>
 #include <vector>
 
+#include "ovmacro/expander/import_handler.h"
 #include "ovmacro/lexer/exceptions.h"
 #include "ovmacro/vars/var_frame.h"
 
@@ -49,9 +50,13 @@ inline constexpr const char* kAtEnd = "\x01<end>";
 int64 OffsetOf(const std::string& text, const char* marker, bool last = false);
 // The offset of p in text, or -1 when p does not point into it (or just past its end).
 int64 OffsetIn(const std::string& text, const char* p);
-// Expands text (which must outlive the frame's definitions) in frame, into a string.
-std::string ExpandIn(VarFrame& frame, const std::string& text);
+// Expands text (which must outlive the frame's definitions) in frame, into a string, with the given import
+// handler (none by default).
+std::string ExpandIn(VarFrame& frame, const std::string& text, ImportHandler* handler = nullptr);
 // Expands text in a fresh file-scope frame.
-std::string ExpandText(const std::string& text);
+std::string ExpandText(const std::string& text, ImportHandler* handler = nullptr);
+// Expands text with ExpandText and expects it to fail with `message` at the position `at` names (see
+// OffsetOf; `last`: its last occurrence).
+void ExpectErrorAt(const std::string& text, const std::string& message, const char* at, bool last = false);
 
 }  // namespace orvan::testing

@@ -1,12 +1,14 @@
-// Tests of variables and variable lists: hiding by name, ownership of every variable added, the diagnostic
-// forms of macros and values, type words, and the lookup counter.
+// Tests of variables and variable lists: hiding by name, ownership of every variable added, the filter of
+// added names, the diagnostic forms of macros and values, type words, and the lookup counter.
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cstdlib>
 #include <memory>
 #include <string>
 #include <vector>
 
+#include "ovmacro/vars/name_filter.h"
 #include "ovmacro/vars/variable_list.h"
 
 namespace orvan {
@@ -87,6 +89,33 @@ TEST(LSVariableListTest, LooksUpByTheCharactersOfTheName) {
     const std::string use = "(abc)";
     EXPECT_EQ(list.Find(BasicSubString(use.data() + 1, use.data() + 4)), v);
     EXPECT_EQ(list.Find(BasicSubString(use.data() + 1, use.data() + 3)), nullptr);
+}
+
+// The expander copies a word whose name fails the filter as plain text, without a lookup: every name that was
+// added must pass, whatever its length and bytes and wherever its text lies.
+TEST(NameFilterTest, EveryAddedNameMayBeContained) {
+    const std::string starts = "abcdefghijklmnopqrst";
+    const std::string ends = "ABCDEFGHIJKLMNOPQRST";
+    std::vector<std::string> names;
+    for (size_t n = 0; n <= 20; ++n) {
+        names.push_back(starts.substr(0, n));  // each shares its start with the shorter ones
+        names.push_back(ends.substr(20 - n));  // each shares its end with the shorter ones
+        std::string high;
+        for (size_t i = 0; i < n; ++i) high += static_cast<char>(0xFF - 3 * i);
+        names.push_back(high);
+        // The same first and last four bytes, different middles.
+        if (n >= 8) names.push_back("firs" + std::string(n - 8, static_cast<char>('0' + n % 10)) + "last");
+    }
+    for (const std::string& name : names) {
+        SCOPED_TRACE(::testing::PrintToString(name));
+        // Added from a buffer of exactly its size, so that AddressSanitizer reports a read past its end, and
+        // looked up as a word inside another text.
+        const std::unique_ptr<char[]> exact(new char[name.size()]);
+        std::copy(name.begin(), name.end(), exact.get());
+        NameFilter::Add(BasicSubString(exact.get(), exact.get() + name.size()));
+        const std::string text = "\xFF(" + name + ")\xFF";
+        EXPECT_TRUE(NameFilter::MayContain(BasicSubString(text.data() + 2, text.data() + 2 + name.size())));
+    }
 }
 
 TEST(LSVariableListTest, EmptyListWritesBraces) {
