@@ -203,6 +203,29 @@ TEST(ExpandedOutputTest, ColumnAfterRunsOfAnyLength) {
     }
 }
 
+// Gathered short runs reach the stream in order: before a long run, at Flush() and when the output dies.
+TEST(ExpandedOutputTest, GatheredRunsReachTheStreamInOrder) {
+    const std::string source = "ab\tc" + std::string(300, 'x') + "d\n";
+    const char* p = source.data();
+    StringStream ss;
+    {
+        ExpandedOutput out(&ss);
+        out.GatherShortRuns();
+        out.WriteSubStringFromSourceFile(BasicSubString(p, p + 2), 2);
+        out.WriteCalculatedSubString(BasicSubString(p + 2, p + 4), BasicSubString(p, p + 1), 0);
+        EXPECT_EQ(ss.str(), "") << "short runs wait";
+        EXPECT_EQ(out.GetColumnPos(), 9);
+        out.WriteSubStringFromSourceFile(BasicSubString(p + 4, p + 304), 0);
+        EXPECT_EQ(ss.str(), "  ab\tc" + std::string(300, 'x')) << "a long run goes at once, after them";
+        out.WriteSubStringFromSourceFile(BasicSubString(p + 304, p + 306), 0);
+        EXPECT_EQ(out.GetCharCount(), 308);
+        out.Flush();
+        EXPECT_EQ(ss.str(), "  " + source);
+        out.WriteSubStringFromSourceFile(BasicSubString(p, p + 1), 0);
+    }
+    EXPECT_EQ(ss.str(), "  " + source + "a") << "destroying the output hands over the rest";
+}
+
 TEST(ExpandedOutputTest, GetPiecesSwapsWithTheCaller) {
     const std::string source = "abcdef";
     StringStream ss;

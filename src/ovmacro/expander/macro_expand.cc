@@ -11,7 +11,9 @@ void MacroExpand(ImportHandler* importHandler, VarFrame* frame, BasicSubString t
     try {
         MacroExpander expander(importHandler, frame, text, inputIndent, outputIndent, output);
         expander.Expand();
+        output.Flush();  // the caller finds the whole expansion in its stream
     } catch (LexScannerException& e) {
+        output.Flush();  // what was written before the failure stays written
         // A position in a text that an expansion made (and that still lives) means nothing to a host: it
         // moves to the source. At every level, since a host may report the errors of a nested expansion.
         MovePositionOutOfHeldTexts(e);
@@ -25,6 +27,7 @@ void MacroExpand(ImportHandler* importHandler, VarFrame* frame, BasicSubString t
     // The expansion of a text is usually about as long as the text: reserve that much at once.
     StringStream stream(static_cast<size_t>(text.size()) + 16);
     ExpandedOutput output(&stream, false);  // nobody asks for the pieces
+    output.GatherShortRuns();
     MacroExpand(importHandler, frame, text, inputIndent, outputIndent, output);
     stream.GetString(result, true);
 }
@@ -34,6 +37,7 @@ void MacroExpand(ImportHandler* importHandler, VarFrame* frame, BasicSubString t
     // The expansion of a text is usually about as long as the text: reserve that much at once.
     StringStream stream(static_cast<size_t>(text.size()) + 16);
     ExpandedOutput output(&stream);
+    output.GatherShortRuns();
     MacroExpand(importHandler, frame, text, inputIndent, outputIndent, output);
     stream.GetString(result, true);
     output.GetPieces(pieces);

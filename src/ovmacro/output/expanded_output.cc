@@ -4,11 +4,19 @@
 
 namespace orvan {
 
+ExpandedOutput::~ExpandedOutput() {
+    try {
+        Flush();
+    } catch (...) {
+        // A stream that fails here (out of memory) loses only what an abandoned expansion wrote last.
+    }
+}
+
 void ExpandedOutput::WriteIndentation(int64 indent) {
     static constexpr char kBlanks[] = "                                                                ";
     for (int64 left = indent; left > 0;) {
         const int64 chunk = left < 64 ? left : 64;
-        stream_->put(kBlanks, chunk);
+        Put(kBlanks, chunk);
         left -= chunk;
     }
     charCount_ += indent;
@@ -16,7 +24,7 @@ void ExpandedOutput::WriteIndentation(int64 indent) {
 
 void ExpandedOutput::WriteRun(const char* p, int64 n) {
     if (n <= 0) return;
-    stream_->put(p, n);
+    Put(p, n);
     charCount_ += n;
     // The column after the run counts from its last line feed, or goes on from the current column. Runs are
     // mostly a few characters long, and one pass over them costs less than two library calls.

@@ -3,7 +3,13 @@
 // It writes to a stream, tracks the column of the current output line (a tab counts 4) so that nested
 // expansions can indent their lines, and records an output piece for each run it writes. Indentation is
 // written lazily, just before the first character of a line.
+//
+// Every write reaches the stream at once, unless the owner asks for short runs to be gathered: the string
+// overloads of MacroExpand, whose many short writes then reach the stream in blocks, at Flush() (which
+// MacroExpand calls before it returns) and when the output is destroyed.
 #pragma once
+
+#include <cstring>
 
 #include "ovmacro/foundations/stream.h"
 #include "ovmacro/output/output_pieces.h"
@@ -15,6 +21,19 @@ public:
     // Without `recordPieces` no pieces are kept (Pieces() stays empty), for hosts that want only the text.
     explicit ExpandedOutput(xostream* stream, bool recordPieces = true)
         : stream_(stream), recordPieces_(recordPieces) {}
+    ExpandedOutput(const ExpandedOutput&) = delete;
+    ExpandedOutput& operator=(const ExpandedOutput&) = delete;
+    ~ExpandedOutput();
+
+    // Lets short runs gather in a buffer until Flush().
+    void GatherShortRuns() { gather_ = true; }
+    // Hands the gathered text to the stream.
+    void Flush() {
+        if (buffered_ == 0) return;
+        const int64 n = buffered_;
+        buffered_ = 0;
+        stream_->put(buffer_, n);
+    }
 
     // Copied text: each character maps back to itself in the source. Lines it begins get `indent` blanks.
     void WriteSubStringFromSourceFile(BasicSubString s, int64 indent);
@@ -27,9 +46,30 @@ public:
     const OutputPieces& Pieces() const { return pieces_; }
     int64 size() const { return pieces_.size(); }
     int64 GetCharCount() const { return charCount_; }
-    xostream* GetStream() const { return stream_; }
+    // The stream, with everything written so far.
+    xostream* GetStream() {
+        Flush();
+        return stream_;
+    }
 
 private:
+    static constexpr int64 kBufferSize = 256;
+
+    void Put(const char* p, int64 n) {
+        if (!gather_) {
+            stream_->put(p, n);
+            return;
+        }
+        if (n > kBufferSize - buffered_) {
+            Flush();
+            if (n > kBufferSize / 2) {
+                stream_->put(p, n);
+                return;
+            }
+        }
+        std::memcpy(buffer_ + buffered_, p, static_cast<size_t>(n));
+        buffered_ += n;
+    }
     void WriteIndentation(int64 indent);
     // At a line start whose indentation is still to be written: writes it (when indent > 0, then true) and
     // sets the column.
@@ -45,6 +85,9 @@ private:
     int64 column_ = -1;
     OutputPieces pieces_;
     int64 charCount_ = 0;
+    bool gather_ = false;
+    int64 buffered_ = 0;
+    char buffer_[kBufferSize];
 };
 
 }  // namespace orvan
