@@ -17,8 +17,10 @@ namespace {
 struct Registry {
     std::mutex lock;
     std::map<const char*, const HeldText*, std::less<const char*>> byBegin;
-    std::atomic<size_t> count{0};  // byBegin.size(), read without the lock by the writers' fast path
 };
+
+// byBegin.size(), read without the lock by the writers' fast path (a plain global: no guard to test).
+std::atomic<size_t> g_heldTextCount{0};
 
 Registry& TheRegistry() {
     static Registry* registry = new Registry;  // never destroyed: frames may die during static destruction
@@ -39,7 +41,7 @@ HeldText::HeldText(BasicSubString name, basic_xstring text, OutputPieces pieces,
     Registry& registry = TheRegistry();
     const std::lock_guard<std::mutex> hold(registry.lock);
     registry.byBegin[value.data()] = this;
-    registry.count = registry.byBegin.size();
+    g_heldTextCount = registry.byBegin.size();
 }
 
 HeldText::~HeldText() {
@@ -47,7 +49,7 @@ HeldText::~HeldText() {
     Registry& registry = TheRegistry();
     const std::lock_guard<std::mutex> hold(registry.lock);
     registry.byBegin.erase(value.data());
-    registry.count = registry.byBegin.size();
+    g_heldTextCount = registry.byBegin.size();
 }
 
 void HeldText::MovePositionOut(LexScannerException& e) const {
@@ -75,8 +77,8 @@ namespace {
 
 // The live held text in which a run starting at p lies (p before its end), or null.
 const HeldText* HeldTextAt(const char* p) {
+    if (g_heldTextCount.load(std::memory_order_relaxed) == 0 || !p) return nullptr;
     Registry& registry = TheRegistry();
-    if (registry.count == 0 || !p) return nullptr;
     const std::lock_guard<std::mutex> hold(registry.lock);
     auto it = registry.byBegin.upper_bound(p);
     if (it == registry.byBegin.begin()) return nullptr;
@@ -87,7 +89,7 @@ const HeldText* HeldTextAt(const char* p) {
 
 // A calculated piece's source moved out of held texts: only its begin is used to place positions.
 BasicSubString SourceOutsideHeldTexts(BasicSubString source) {
-    if (TheRegistry().count == 0 || !source.begin()) return source;
+    if (g_heldTextCount.load(std::memory_order_relaxed) == 0 || !source.begin()) return source;
     LexScannerException probe("", source.begin());
     MovePositionOutOfHeldTexts(probe);
     if (probe.GetPosition() == source.begin()) return source;

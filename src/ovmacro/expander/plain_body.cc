@@ -106,6 +106,8 @@ private:
     size_t next_ = 0;
 };
 
+// The default TLS model: a block this large in the static TLS area could keep a host from loading the
+// library with dlopen.
 thread_local PlainBodySplits t_splits;
 
 // Whether an argument expands to itself in `frame`: ordinary text, and names that no variable there has.
