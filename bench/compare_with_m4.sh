@@ -5,7 +5,7 @@
 #
 # Needs: GNU m4 and /usr/bin/time (scripts/install-deps.sh installs m4; this script installs nothing). It
 # builds ovmacro in Release into build/bench and writes its inputs and outputs into a temporary directory,
-# removed at the end. Usage: bench/compare_with_m4.sh   (RUNS=N sets the timed runs per tool, default 5)
+# removed at the end. Usage: bench/compare_with_m4.sh   (RUNS=N sets the timed runs per tool, default 7)
 #
 # Workloads (the two tools must produce byte-identical outputs, which is checked):
 #   plain text    40 MB of words, digits and punctuation without directives, which both tools copy unchanged
@@ -24,7 +24,7 @@
 # Each tool runs RUNS times, alternating with the other (after one untimed run each), with output to a file.
 set -euo pipefail
 cd "$(dirname "$0")/.."
-runs=${RUNS:-5}
+runs=${RUNS:-7}
 
 for tool in m4 /usr/bin/time; do
   command -v "$tool" >/dev/null || { echo "compare_with_m4: $tool is needed (scripts/install-deps.sh)" >&2; exit 2; }

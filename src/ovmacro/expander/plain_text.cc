@@ -80,11 +80,48 @@ const char* EndOfIdentifier(const char* p, const char* end) {
     return p;
 }
 
-}  // namespace
+// Where no variable has a name yet, words need no look, and of all bytes only digits, quotes, '+', '/', '@',
+// control characters (but tabs, and line feeds unless they need work) and DEL can begin a token that matters.
+// Returns the first such byte from p, looking at blocks of sixteen only: a shorter rest is left to the caller.
+const char* EndOfQuietBytes(const char* p, const char* end, bool lineFeedsNeedWork) {
+#if defined(__SSE2__)
+    const __m128i lineFeed = lineFeedsNeedWork ? _mm_setzero_si128() : _mm_set1_epi8('\n');
+    while (end - p >= 16) {
+        const __m128i x = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p));
+        const __m128i ascii = _mm_cmpgt_epi8(x, _mm_set1_epi8(-1));
+        const __m128i control = _mm_and_si128(ascii, _mm_cmplt_epi8(x, _mm_set1_epi8(0x20)));
+        const __m128i allowed = _mm_or_si128(_mm_cmpeq_epi8(x, _mm_set1_epi8('\t')), _mm_cmpeq_epi8(x, lineFeed));
+        const __m128i digit =
+            _mm_and_si128(_mm_cmpgt_epi8(x, _mm_set1_epi8('0' - 1)), _mm_cmplt_epi8(x, _mm_set1_epi8('9' + 1)));
+        __m128i loud = _mm_or_si128(_mm_andnot_si128(allowed, control), digit);
+        for (const char c : {'"', '\'', '+', '/', '@', '\x7f'})
+            loud = _mm_or_si128(loud, _mm_cmpeq_epi8(x, _mm_set1_epi8(c)));
+        const unsigned mask = static_cast<unsigned>(_mm_movemask_epi8(loud));
+        if (mask != 0) return p + __builtin_ctz(mask);
+        p += 16;
+    }
+#else
+    (void)end;
+    (void)lineFeedsNeedWork;
+#endif
+    return p;
+}
 
-PlainTextRun SkipPlainText(const char* p, const char* end, bool lineFeedsNeedWork, bool dollarMacrosActive) {
+PlainTextRun SkipPlainTextIn(const char* p, const char* end, bool lineFeedsNeedWork, bool dollarMacrosActive,
+                             bool noNames) {
     const char* ordinaryEnd = p;
     while (p < end) {
+        if (noNames) {
+            // Skip the quiet bytes, then go on from the start of the word the first other byte lies in (a
+            // digit or quote inside a word belongs to it), which is where a token begins.
+            const char* q = EndOfQuietBytes(p, end, lineFeedsNeedWork);
+            while (q > p && kIdentifierBytes[static_cast<unsigned char>(q[-1])]) --q;
+            const char* lastToken = q;
+            while (lastToken > p && (lastToken[-1] == ' ' || lastToken[-1] == '\t')) --lastToken;
+            if (lastToken > p) ordinaryEnd = lastToken;
+            p = q;
+            if (p == end) break;
+        }
         const unsigned char c = static_cast<unsigned char>(*p);
         const CharClass k = kClasses[c];
         // Words and the blanks between them are most of any text: they take the shortest way.
@@ -98,7 +135,7 @@ PlainTextRun SkipPlainText(const char* p, const char* end, bool lineFeedsNeedWor
                 continue;
             }
             const char* q = EndOfIdentifier(p + 1, end);
-            if (NameFilter::MayContain(BasicSubString(p, q))) return {p, ordinaryEnd, q};
+            if (!noNames && NameFilter::MayContain(BasicSubString(p, q))) return {p, ordinaryEnd, q};
             ordinaryEnd = p = q;
             continue;
         }
@@ -170,6 +207,17 @@ PlainTextRun SkipPlainText(const char* p, const char* end, bool lineFeedsNeedWor
         }
     }
     return {p, ordinaryEnd, nullptr};
+}
+
+}  // namespace
+
+PlainTextRun SkipPlainText(const char* p, const char* end, bool lineFeedsNeedWork, bool dollarMacrosActive) {
+    return SkipPlainTextIn(p, end, lineFeedsNeedWork, dollarMacrosActive, NameFilter::Generation() == 0);
+}
+
+PlainTextRun SkipPlainTextWithoutNames(const char* p, const char* end, bool lineFeedsNeedWork,
+                                       bool dollarMacrosActive) {
+    return SkipPlainTextIn(p, end, lineFeedsNeedWork, dollarMacrosActive, true);
 }
 
 }  // namespace orvan

@@ -17,5 +17,9 @@ struct PlainTextRun {
 // named a variable. It stops at the start of any other token; scanning errors are raised exactly as the token
 // scanner raises them, at the same positions.
 PlainTextRun SkipPlainText(const char* p, const char* end, bool lineFeedsNeedWork, bool dollarMacrosActive);
+// SkipPlainText as it runs while no variable has ever been named in the process, when it skips words
+// without looking them up (for tests: the filter of names is shared by the whole process).
+PlainTextRun SkipPlainTextWithoutNames(const char* p, const char* end, bool lineFeedsNeedWork,
+                                       bool dollarMacrosActive);
 
 }  // namespace orvan
