@@ -107,8 +107,9 @@ const char* EndOfQuietBytes(const char* p, const char* end, bool lineFeedsNeedWo
     return p;
 }
 
-PlainTextRun SkipPlainTextIn(const char* p, const char* end, bool lineFeedsNeedWork, bool dollarMacrosActive,
-                             bool noNames) {
+// Inlined into its two callers, each of which fixes `noNames`.
+[[gnu::always_inline]] inline PlainTextRun SkipPlainTextIn(const char* p, const char* end, bool lineFeedsNeedWork,
+                                                           bool dollarMacrosActive, bool noNames) {
     const char* ordinaryEnd = p;
     while (p < end) {
         if (noNames) {
@@ -212,7 +213,8 @@ PlainTextRun SkipPlainTextIn(const char* p, const char* end, bool lineFeedsNeedW
 }  // namespace
 
 PlainTextRun SkipPlainText(const char* p, const char* end, bool lineFeedsNeedWork, bool dollarMacrosActive) {
-    return SkipPlainTextIn(p, end, lineFeedsNeedWork, dollarMacrosActive, NameFilter::Generation() == 0);
+    if (NameFilter::Generation() == 0) return SkipPlainTextIn(p, end, lineFeedsNeedWork, dollarMacrosActive, true);
+    return SkipPlainTextIn(p, end, lineFeedsNeedWork, dollarMacrosActive, false);
 }
 
 PlainTextRun SkipPlainTextWithoutNames(const char* p, const char* end, bool lineFeedsNeedWork,

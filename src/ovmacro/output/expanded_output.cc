@@ -22,25 +22,44 @@ void ExpandedOutput::WriteIndentation(int64 indent) {
     charCount_ += indent;
 }
 
+namespace {
+
+// One pass over a short run: its last line feed and the tabs after it, and with `kCopy` a copy of it at out.
+template <bool kCopy>
+void ScanShortRun(const char* p, const char* end, char* out, const char*& lineStart, int64& tabs) {
+    for (const char* q = p; q < end; ++q) {
+        const char c = *q;
+        if constexpr (kCopy) *out++ = c;
+        if (c == '\n') {
+            lineStart = q + 1;
+            tabs = 0;
+        } else {
+            tabs += c == '\t';
+        }
+    }
+}
+
+}  // namespace
+
 void ExpandedOutput::WriteRun(const char* p, int64 n) {
     if (n <= 0) return;
-    Put(p, n);
     charCount_ += n;
     // The column after the run counts from its last line feed, or goes on from the current column. Runs are
-    // mostly a few characters long, and one pass over them costs less than two library calls.
+    // mostly a few characters long: one pass over them, which also gathers them, costs less than library calls.
     const char* const end = p + n;
     const char* lineStart = nullptr;
     int64 tabs = 0;
     if (n <= 32) {
-        for (const char* q = p; q < end; ++q) {
-            if (*q == '\n') {
-                lineStart = q + 1;
-                tabs = 0;
-            } else {
-                tabs += *q == '\t';
-            }
+        if (gather_) {
+            if (n > kBufferSize - buffered_) Flush();
+            ScanShortRun<true>(p, end, buffer_ + buffered_, lineStart, tabs);
+            buffered_ += n;
+        } else {
+            stream_->put(p, n);
+            ScanShortRun<false>(p, end, nullptr, lineStart, tabs);
         }
     } else {
+        Put(p, n);
         const char* lastLf = static_cast<const char*>(memrchr(p, '\n', static_cast<size_t>(n)));
         if (lastLf) lineStart = lastLf + 1;
         for (const char* q = lineStart ? lineStart : p; q < end; ++q) tabs += *q == '\t';
