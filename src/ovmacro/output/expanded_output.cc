@@ -39,6 +39,14 @@ void ScanShortRun(const char* p, const char* end, char* out, const char*& lineSt
     }
 }
 
+// The first line feed in [p, end), or null. Runs are mostly short, where a loop costs less than a call.
+const char* FindLineFeed(const char* p, const char* end) {
+    if (end - p > 32) return static_cast<const char*>(std::memchr(p, '\n', static_cast<size_t>(end - p)));
+    for (; p < end; ++p)
+        if (*p == '\n') return p;
+    return nullptr;
+}
+
 }  // namespace
 
 void ExpandedOutput::WriteRun(const char* p, int64 n) {
@@ -97,7 +105,7 @@ void ExpandedOutput::WriteSubStringFromSourceFile(BasicSubString s, int64 indent
     while (p < end) {
         if (StartLine(indent)) AddPiece(OutputPiece(BasicSubString(), indent));
         // Up to and including the next line feed: the line after it gets its indentation first.
-        const char* lf = static_cast<const char*>(std::memchr(p, '\n', static_cast<size_t>(end - p)));
+        const char* lf = FindLineFeed(p, end);
         const char* runEnd = lf ? lf + 1 : end;
         WriteRun(p, runEnd - p);
         AddPiece(OutputPiece(BasicSubString(p, runEnd), 0));
@@ -112,8 +120,7 @@ void ExpandedOutput::WriteCalculatedSubString(BasicSubString s, BasicSubString s
     const char* end = s.end();
     while (p < end) {
         if (StartLine(indent)) n += indent;
-        const char* lf = indent > 0 ? static_cast<const char*>(std::memchr(p, '\n', static_cast<size_t>(end - p)))
-                                    : nullptr;
+        const char* lf = indent > 0 ? FindLineFeed(p, end) : nullptr;
         const char* runEnd = lf ? lf + 1 : end;
         WriteRun(p, runEnd - p);
         p = runEnd;
