@@ -31,10 +31,8 @@ for tool in m4 /usr/bin/time; do
 done
 
 echo "== building ovmacro (Release, build/bench)"
-cmake -S . -B build/bench -DCMAKE_BUILD_TYPE=Release -DOVMACRO_BUILD_TESTS=OFF -DOVMACRO_BUILD_BENCHMARKS=OFF \
-  >/dev/null
-cmake --build build/bench -j"$(nproc)" --target ovmacro >/dev/null
-ovmacro=$PWD/build/bench/tools/ovmacro/ovmacro
+source bench/common.sh
+build_release_ovmacro
 
 work=$(mktemp -d "${TMPDIR:-/tmp}/ovmacro-vs-m4.XXXXXX")
 trap 'rm -rf "$work"' EXIT
@@ -64,14 +62,14 @@ plain_bytes=$(stat -c %s "$work/plain.ovm")
 
 calls=500000
 {
-  echo '@def greet(a, b) = {Hello a and b!}'
-  seq "$calls" | sed 's/.*/x greet(a&, b) y/'
+  echo "$greet_definition"
+  write_call_lines "$calls"
 } >"$work/calls.ovm"
 {
   cat <<'EOF'
 m4_define(`greet', `Hello $1 and $2!')m4_dnl
 EOF
-  seq "$calls" | sed 's/.*/x greet(a&, b) y/'
+  write_call_lines "$calls"
 } >"$work/calls.m4"
 
 items=100000

@@ -11,18 +11,16 @@ cd "$(dirname "$0")/.."
 calls=${1:-20000}
 
 command -v valgrind >/dev/null || { echo "instructions_per_call: valgrind is needed" >&2; exit 2; }
-cmake -S . -B build/bench -DCMAKE_BUILD_TYPE=Release -DOVMACRO_BUILD_TESTS=OFF -DOVMACRO_BUILD_BENCHMARKS=OFF \
-  >/dev/null
-cmake --build build/bench -j"$(nproc)" --target ovmacro >/dev/null
-ovmacro=$PWD/build/bench/tools/ovmacro/ovmacro
+source bench/common.sh
+build_release_ovmacro
 
 work=$(mktemp -d "${TMPDIR:-/tmp}/ovmacro-calls.XXXXXX")
 trap 'rm -rf "$work"' EXIT
 {
-  echo '@def greet(a, b) = {Hello a and b!}'
-  seq "$calls" | sed 's/.*/x greet(a&, b) y/'
+  echo "$greet_definition"
+  write_call_lines "$calls"
 } >"$work/calls.ovm"
-echo '@def greet(a, b) = {Hello a and b!}' >"$work/empty.ovm"
+echo "$greet_definition" >"$work/empty.ovm"
 
 # instructions FILE: the instructions callgrind counts for expanding FILE (start-up included).
 instructions() {

@@ -36,6 +36,22 @@ std::string Str(BasicSubString s) {
     return std::string(s.view());
 }
 
+// ScanArgument over an exact-size copy of input: the argument, the ending token's type and offset, the rest.
+struct ScannedArgument {
+    std::string arg;
+    EToken ended;
+    int64 endedAt;
+    std::string rest;
+};
+
+ScannedArgument ScanArgumentOf(const char* input, EToken terminator) {
+    const ExactBuffer buf(input);
+    BasicSubString s = buf.view();
+    BasicSubString arg;
+    const LSToken ended = ScanArgument(s, arg, terminator);
+    return {Str(arg), ended.GetType(), buf.Offset(ended.text.begin()), Str(s)};
+}
+
 // Runs a scanner on a fresh copy of the input and checks the message and offset of the error it raises.
 void ExpectError(const char* input, const std::function<void(BasicSubString&)>& scan,
                  const std::string& message, int64 offset) {
@@ -88,13 +104,10 @@ TEST(ScanArgumentTest, TokenAndBackquotedForms) {
     };
     for (const auto& c : cases) {
         SCOPED_TRACE(::testing::PrintToString(std::string(c.input)));
-        const ExactBuffer buf(c.input);
-        BasicSubString s = buf.view();
-        BasicSubString arg;
-        const LSToken ended = ScanArgument(s, arg, c.terminator);
-        EXPECT_EQ(Str(arg), c.arg);
-        EXPECT_EQ(ended.GetType(), c.ended);
-        EXPECT_EQ(Str(s), c.rest);
+        const ScannedArgument got = ScanArgumentOf(c.input, c.terminator);
+        EXPECT_EQ(got.arg, c.arg);
+        EXPECT_EQ(got.ended, c.ended);
+        EXPECT_EQ(got.rest, c.rest);
     }
 }
 
@@ -134,15 +147,11 @@ TEST(ScanArgumentTest, SingleNamesReadLikeAnyOtherArgument) {
     };
     for (const auto& c : cases) {
         SCOPED_TRACE(::testing::PrintToString(std::string(c.input)));
-        const ExactBuffer buf(c.input);
-        BasicSubString s = buf.view();
-        BasicSubString arg;
-        const LSToken ended = ScanArgument(s, arg, c.terminator);
-        EXPECT_EQ(Str(arg), c.arg);
-        EXPECT_EQ(ended.GetType(), c.ended);
-        EXPECT_EQ(buf.Offset(ended.text.begin()), c.endedAt);
-        EXPECT_EQ(ended.text.view().size(), 1u);
-        EXPECT_EQ(Str(s), c.rest);
+        const ScannedArgument got = ScanArgumentOf(c.input, c.terminator);
+        EXPECT_EQ(got.arg, c.arg);
+        EXPECT_EQ(got.ended, c.ended);
+        EXPECT_EQ(got.endedAt, c.endedAt);
+        EXPECT_EQ(got.rest, c.rest);
     }
 
     // A name that is not followed by a comma or this terminator reads on to the end.
