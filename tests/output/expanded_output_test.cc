@@ -91,6 +91,11 @@ const SequenceCase kSequences[] = {
      "  abc",
      5,
      {{-1, -1, 2}, {0, 2, 0}, {2, 3, 1}}},
+    {"a line inside a short run in the middle of a line is indented",
+     {{false, "a", 2}, {false, "x\ny\n", 3}},
+     "  ax\n   y\n",
+     -1,
+     {{-1, -1, 2}, {0, 3, 0}, {-1, -1, 3}, {3, 5, 0}}},
     {"a tab counts 4 columns, not aligned to tab stops", {{false, "a\tb", 0}}, "a\tb", 6, {{0, 3, 0}}},
     {"tabs after indentation", {{false, "\t\t", 3}}, "   \t\t", 11, {{-1, -1, 3}, {0, 2, 0}}},
     {"the column restarts after a line feed",
@@ -125,15 +130,18 @@ const SequenceCase kSequences[] = {
      {{0, 52, 58}}},
 };
 
-// Each sequence is written twice: with pieces, and without (the same text and column, no pieces).
+// Each sequence is written three ways: with pieces; without (the same text and column, no pieces); and with
+// short runs gathered before they reach the stream (the same text, column and pieces after Flush).
 TEST(ExpandedOutputTest, IndentationColumnAndPiecesOverSequencesOfWrites) {
     for (const SequenceCase& c : kSequences) {
-        for (const bool recordPieces : {true, false}) {
-            SCOPED_TRACE(std::string(c.name) + (recordPieces ? "" : ", without pieces"));
+        for (const char* way : {"with pieces", "without pieces", "gathering short runs"}) {
+            SCOPED_TRACE(std::string(c.name) + ", " + way);
+            const bool recordPieces = std::string(way) != "without pieces";
             std::string source;
             for (const Write& w : c.writes) source += w.text;
             StringStream ss;
             ExpandedOutput out(&ss, recordPieces);
+            if (std::string(way) == "gathering short runs") out.GatherShortRuns();
             const char* p = source.data();
             for (const Write& w : c.writes) {
                 const BasicSubString text(p, p + w.text.size());
@@ -143,6 +151,7 @@ TEST(ExpandedOutputTest, IndentationColumnAndPiecesOverSequencesOfWrites) {
                 else
                     out.WriteSubStringFromSourceFile(text, w.indent);
             }
+            out.Flush();
             EXPECT_EQ(ss.str(), c.expected);
             EXPECT_EQ(out.GetColumnPos(), c.column);
             const int64 written = static_cast<int64>(ss.str().size());

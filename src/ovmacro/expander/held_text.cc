@@ -19,8 +19,7 @@ struct Registry {
     std::map<const char*, const HeldText*, std::less<const char*>> byBegin;
 };
 
-// byBegin.size(), read without the lock by the writers' fast path (a plain global: no guard to test).
-std::atomic<size_t> g_heldTextCount{0};
+
 
 Registry& TheRegistry() {
     static Registry* registry = new Registry;  // never destroyed: frames may die during static destruction
@@ -41,7 +40,7 @@ HeldText::HeldText(BasicSubString name, basic_xstring text, OutputPieces pieces,
     Registry& registry = TheRegistry();
     const std::lock_guard<std::mutex> hold(registry.lock);
     registry.byBegin[value.data()] = this;
-    g_heldTextCount = registry.byBegin.size();
+    g_liveHeldTexts = registry.byBegin.size();
 }
 
 HeldText::~HeldText() {
@@ -49,7 +48,7 @@ HeldText::~HeldText() {
     Registry& registry = TheRegistry();
     const std::lock_guard<std::mutex> hold(registry.lock);
     registry.byBegin.erase(value.data());
-    g_heldTextCount = registry.byBegin.size();
+    g_liveHeldTexts = registry.byBegin.size();
 }
 
 void HeldText::MovePositionOut(LexScannerException& e) const {
@@ -77,7 +76,7 @@ namespace {
 
 // The live held text in which a run starting at p lies (p before its end), or null.
 const HeldText* HeldTextAt(const char* p) {
-    if (g_heldTextCount.load(std::memory_order_relaxed) == 0 || !p) return nullptr;
+    if (g_liveHeldTexts.load(std::memory_order_relaxed) == 0 || !p) return nullptr;
     Registry& registry = TheRegistry();
     const std::lock_guard<std::mutex> hold(registry.lock);
     auto it = registry.byBegin.upper_bound(p);
@@ -89,7 +88,7 @@ const HeldText* HeldTextAt(const char* p) {
 
 // A calculated piece's source moved out of held texts: only its begin is used to place positions.
 BasicSubString SourceOutsideHeldTexts(BasicSubString source) {
-    if (g_heldTextCount.load(std::memory_order_relaxed) == 0 || !source.begin()) return source;
+    if (g_liveHeldTexts.load(std::memory_order_relaxed) == 0 || !source.begin()) return source;
     LexScannerException probe("", source.begin());
     MovePositionOutOfHeldTexts(probe);
     if (probe.GetPosition() == source.begin()) return source;
@@ -100,7 +99,9 @@ BasicSubString SourceOutsideHeldTexts(BasicSubString source) {
 
 bool IsInHeldText(const char* p) { return HeldTextAt(p) != nullptr; }
 
-void WriteCopiedText(ExpandedOutput& output, BasicSubString s, int64 indent) {
+std::atomic<size_t> g_liveHeldTexts{0};
+
+void WriteCopiedTextPieceByPiece(ExpandedOutput& output, BasicSubString s, int64 indent) {
     const HeldText* held = HeldTextAt(s.begin());
     if (!held) {
         output.WriteSubStringFromSourceFile(s, indent);

@@ -14,6 +14,8 @@
 //     // when the keeper goes, a frame that received definitions takes the text over
 #pragma once
 
+#include <atomic>
+
 #include <memory>
 
 #include "ovmacro/lexer/exceptions.h"
@@ -54,7 +56,15 @@ void MovePositionOutOfHeldTexts(LexScannerException& e);
 // part of it: copied where the held text copied them, calculated and mapped to their source otherwise.
 // Whether p lies in a live held text (its end excluded); cheap when none lives.
 bool IsInHeldText(const char* p);
-void WriteCopiedText(ExpandedOutput& output, BasicSubString s, int64 indent);
+// The number of live held texts, read without a lock by the writers' fast path.
+extern std::atomic<size_t> g_liveHeldTexts;
+void WriteCopiedTextPieceByPiece(ExpandedOutput& output, BasicSubString s, int64 indent);
+inline void WriteCopiedText(ExpandedOutput& output, BasicSubString s, int64 indent) {
+    if (g_liveHeldTexts.load(std::memory_order_relaxed) == 0)
+        output.WriteSubStringFromSourceFile(s, indent);
+    else
+        WriteCopiedTextPieceByPiece(output, s, indent);
+}
 void WriteCalculatedText(ExpandedOutput& output, BasicSubString s, BasicSubString source, int64 indent);
 
 // Owns a held text while it is expanded. When the keeper goes (also when an error passes), the outermost of

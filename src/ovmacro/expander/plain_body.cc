@@ -47,31 +47,35 @@ bool ScanPlainBody(const LSMacroVariable& m, bool dollarMacrosActive, ArgumentUs
     }
 }
 
-// The splits of the bodies a thread invoked last. A split depends on the body's text, the names of the
-// formal arguments, the two flags that SkipPlainText takes, and the name filter; entries are matched by
-// content, since a text may be freed and another written at its address.
+// The splits of the bodies a thread invoked last. A split depends on the macro's body and formal arguments,
+// the two flags that SkipPlainText takes, and the name filter. A macro is known by its identity and by where
+// its body and argument names lie, so that a host that gives it another body or other arguments is noticed.
 class PlainBodySplits {
 public:
     bool Split(const LSMacroVariable& m, bool dollarMacrosActive, ArgumentUse* uses, int64& count) {
         const BasicSubString body = m.GetSubstitutionString();
         const bool indented = m.GetIndent() > 0;
-        const std::uint64_t generation = NameFilter::Generation();
         for (Entry& e : entries_) {
-            if (!e.Matches(m, body, indented, dollarMacrosActive, generation)) continue;
+            if (!e.Matches(m, body, indented, dollarMacrosActive, NameFilter::Generation())) continue;
             count = e.count;
             for (int64 u = 0; u < count; ++u)
                 uses[u] = {body.begin() + e.uses[u].begin, body.begin() + e.uses[u].end, e.uses[u].arg};
             return e.plain;
         }
+        // The general way binds each argument in a list, which lets the fast lane stop at its name; without
+        // the binding the name must reach the filter here.
+        for (int64 i = 0; i < m.GetNumArgs(); ++i)
+            if (!NameFilter::MayContain(m.GetArg(i).name)) NameFilter::Add(m.GetArg(i).name);
         Entry& e = entries_[next_];
         next_ = (next_ + 1) % kEntries;
+        e.generation = NameFilter::Generation();
         e.plain = ScanPlainBody(m, dollarMacrosActive, uses, count);
-        e.body.assign(body.view());
+        e.identity = m.identity;
+        e.body = body;
         e.formals.clear();
-        for (int64 i = 0; i < m.GetNumArgs(); ++i) e.formals.emplace_back(m.GetArg(i).name.view());
+        for (int64 i = 0; i < m.GetNumArgs(); ++i) e.formals.push_back(m.GetArg(i).name);
         e.indented = indented;
         e.dollarMacrosActive = dollarMacrosActive;
-        e.generation = generation;
         e.count = e.plain ? count : 0;
         for (int64 u = 0; u < e.count; ++u)
             e.uses[u] = {uses[u].begin - body.begin(), uses[u].end - body.begin(), uses[u].arg};
@@ -82,22 +86,25 @@ private:
     struct Use {
         int64 begin, end, arg;  // offsets in the body
     };
+    static bool SameView(BasicSubString a, BasicSubString b) { return a.begin() == b.begin() && a.end() == b.end(); }
     struct Entry {
         bool Matches(const LSMacroVariable& m, BasicSubString text, bool indentedNow, bool dollarNow,
                      std::uint64_t generationNow) const {
-            if (generation != generationNow || indented != indentedNow || dollarMacrosActive != dollarNow)
+            if (identity != m.identity || generation != generationNow || indented != indentedNow ||
+                dollarMacrosActive != dollarNow || !SameView(body, text) ||
+                formals.size() != static_cast<size_t>(m.GetNumArgs()))
                 return false;
-            if (formals.size() != static_cast<size_t>(m.GetNumArgs()) || body != text.view()) return false;
             for (size_t i = 0; i < formals.size(); ++i)
-                if (formals[i] != m.GetArg(static_cast<int64>(i)).name.view()) return false;
+                if (!SameView(formals[i], m.GetArg(static_cast<int64>(i)).name)) return false;
             return true;
         }
-        std::uint64_t generation = ~std::uint64_t{0};
+        std::uint64_t identity = 0;  // no macro has identity 0
+        std::uint64_t generation = 0;
         bool indented = false;
         bool dollarMacrosActive = false;
         bool plain = false;
-        basic_xstring body;
-        xvector<basic_xstring> formals;
+        BasicSubString body;
+        xvector<BasicSubString> formals;
         int64 count = 0;
         Use uses[kMaxPlainBodyUses];
     };
@@ -131,15 +138,9 @@ bool MacroExpander::ExpandPlainBody(const LSMacroVariable& m, VarFrame* parentFr
                                     std::span<const BasicSubString> actual) {
     // Naked macros leave their bindings behind, and typed arguments or results need evaluation.
     if (m.IsPython() || m.IsNaked() || m.GetReturnType() != LSV_Macro) return false;
-    for (int64 i = 0; i < m.GetNumArgs(); ++i) {
-        const LSFormalArg& formal = m.GetArg(i);
-        if (formal.type != LSV_Macro || formal.isFnArg) return false;
-        // The general way binds each argument in a list, which lets the fast lane stop at its name; without
-        // the binding the name must reach the filter here.
-        if (!NameFilter::MayContain(formal.name)) NameFilter::Add(formal.name);
-    }
+    for (int64 i = 0; i < m.GetNumArgs(); ++i)
+        if (m.GetArg(i).type != LSV_Macro || m.GetArg(i).isFnArg) return false;
     const FileScopeVarFrame* bodyScope = parentFrame->GetFileScopeVarFrame();
-    const FileScopeVarFrame* argScope = frame->GetFileScopeVarFrame();
     auto dollarMacrosActive = [](const FileScopeVarFrame* scope) {
         return scope && (!scope->dollarMacros.empty() || !scope->importedFiles.empty());
     };
@@ -149,6 +150,7 @@ bool MacroExpander::ExpandPlainBody(const LSMacroVariable& m, VarFrame* parentFr
 
     const BasicSubString body = m.GetSubstitutionString();
     const int64 bodyIndent = GetOutputPos();
+    const bool argDollarMacrosActive = count > 0 && dollarMacrosActive(frame->GetFileScopeVarFrame());
     auto writeCopied = [&](BasicSubString s, int64 indent) {
         if (s.empty()) return;
         const int64 before = output->GetCharCount();
@@ -165,7 +167,7 @@ bool MacroExpander::ExpandPlainBody(const LSMacroVariable& m, VarFrame* parentFr
             const BasicSubString arg = actual[static_cast<size_t>(uses[u].arg)];
             const int64 column = output->GetColumnPos();
             const int64 argIndent = column >= 0 ? column : bodyIndent;
-            if (IsOrdinaryTextIn(arg, frame, dollarMacrosActive(argScope))) {
+            if (IsOrdinaryTextIn(arg, frame, argDollarMacrosActive)) {
                 writeCopied(arg, argIndent);
                 continue;
             }

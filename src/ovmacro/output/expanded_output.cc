@@ -24,21 +24,6 @@ void ExpandedOutput::WriteIndentation(int64 indent) {
 
 namespace {
 
-// One pass over a short run: its last line feed and the tabs after it, and with `kCopy` a copy of it at out.
-template <bool kCopy>
-void ScanShortRun(const char* p, const char* end, char* out, const char*& lineStart, int64& tabs) {
-    for (const char* q = p; q < end; ++q) {
-        const char c = *q;
-        if constexpr (kCopy) *out++ = c;
-        if (c == '\n') {
-            lineStart = q + 1;
-            tabs = 0;
-        } else {
-            tabs += c == '\t';
-        }
-    }
-}
-
 // The first line feed in [p, end), or null. Runs are mostly short, where a loop costs less than a call.
 const char* FindLineFeed(const char* p, const char* end) {
     if (end - p > 32) return static_cast<const char*>(std::memchr(p, '\n', static_cast<size_t>(end - p)));
@@ -52,12 +37,11 @@ const char* FindLineFeed(const char* p, const char* end) {
 void ExpandedOutput::WriteRun(const char* p, int64 n) {
     if (n <= 0) return;
     charCount_ += n;
-    // The column after the run counts from its last line feed, or goes on from the current column. Runs are
-    // mostly a few characters long: one pass over them, which also gathers them, costs less than library calls.
+    // The column after the run counts from its last line feed, or goes on from the current column.
     const char* const end = p + n;
     const char* lineStart = nullptr;
     int64 tabs = 0;
-    if (n <= 32) {
+    if (n <= kShortRun) {
         if (gather_) {
             if (n > kBufferSize - buffered_) Flush();
             ScanShortRun<true>(p, end, buffer_ + buffered_, lineStart, tabs);
@@ -72,12 +56,7 @@ void ExpandedOutput::WriteRun(const char* p, int64 n) {
         if (lastLf) lineStart = lastLf + 1;
         for (const char* q = lineStart ? lineStart : p; q < end; ++q) tabs += *q == '\t';
     }
-    if (lineStart == end) {
-        column_ = -1;  // the run ends its line: the next line's indentation is still to be written
-        return;
-    }
-    const int64 before = lineStart ? 0 : (column_ < 0 ? 0 : column_);
-    column_ = before + (end - (lineStart ? lineStart : p)) + 3 * tabs;
+    SetColumnAfter(p, end, lineStart, tabs);
 }
 
 bool ExpandedOutput::StartLine(int64 indent) {
@@ -91,7 +70,7 @@ bool ExpandedOutput::StartLine(int64 indent) {
     return true;
 }
 
-void ExpandedOutput::WriteSubStringFromSourceFile(BasicSubString s, int64 indent) {
+void ExpandedOutput::WriteCopiedRuns(BasicSubString s, int64 indent) {
     const char* p = s.begin();
     const char* end = s.end();
     if (indent <= 0) {

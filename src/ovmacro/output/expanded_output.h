@@ -36,7 +36,9 @@ public:
     }
 
     // Copied text: each character maps back to itself in the source. Lines it begins get `indent` blanks.
-    void WriteSubStringFromSourceFile(BasicSubString s, int64 indent);
+    void WriteSubStringFromSourceFile(BasicSubString s, int64 indent) {
+        if (!TryGatherShortRun(s, indent)) WriteCopiedRuns(s, indent);
+    }
     // Calculated text: all of it (its inserted indentation included) maps back to `source`.
     void WriteCalculatedSubString(BasicSubString s, BasicSubString source, int64 indent);
     // The column in the current line; -1 at the start of a line whose indentation is not yet written.
@@ -54,6 +56,53 @@ public:
 
 private:
     static constexpr int64 kBufferSize = 256;
+    static constexpr int64 kShortRun = 32;
+
+    // One pass over a short run: its last line feed and the tabs after it, and with `kCopy` a copy of it at
+    // out. Runs are mostly a few characters long, where this costs less than library calls.
+    template <bool kCopy>
+    static void ScanShortRun(const char* p, const char* end, char* out, const char*& lineStart, int64& tabs) {
+        for (const char* q = p; q < end; ++q) {
+            const char c = *q;
+            if constexpr (kCopy) *out++ = c;
+            if (c == '\n') {
+                lineStart = q + 1;
+                tabs = 0;
+            } else {
+                tabs += c == '\t';
+            }
+        }
+    }
+    // The column after a run that ends at `end`, from its last line feed (null: none) and the tabs after it.
+    void SetColumnAfter(const char* p, const char* end, const char* lineStart, int64 tabs) {
+        if (lineStart == end) {
+            column_ = -1;  // the run ends its line: the next line's indentation is still to be written
+            return;
+        }
+        const int64 before = lineStart ? 0 : (column_ < 0 ? 0 : column_);
+        column_ = before + (end - (lineStart ? lineStart : p)) + 3 * tabs;
+    }
+    // Most copied text is short runs inside a line: gathered in one pass, with its piece. False, having
+    // written nothing, for anything else (not gathering, long, or a line inside it to indent).
+    bool TryGatherShortRun(BasicSubString s, int64 indent) {
+        const int64 n = s.size();
+        if (!gather_ || n <= 0 || n > kShortRun || n > kBufferSize - buffered_ || (column_ < 0 && indent > 0))
+            return false;
+        if (indent > 0) {
+            // A line feed before the last character begins a line inside the run, which needs indentation.
+            for (const char* q = s.begin(); q + 1 < s.end(); ++q)
+                if (*q == '\n') return false;
+        }
+        const char* lineStart = nullptr;
+        int64 tabs = 0;
+        ScanShortRun<true>(s.begin(), s.end(), buffer_ + buffered_, lineStart, tabs);
+        buffered_ += n;
+        charCount_ += n;
+        SetColumnAfter(s.begin(), s.end(), lineStart, tabs);
+        AddPiece(OutputPiece(s, 0));
+        return true;
+    }
+    void WriteCopiedRuns(BasicSubString s, int64 indent);
 
     void Put(const char* p, int64 n) {
         if (!gather_) {

@@ -1,5 +1,7 @@
 #include "ovmacro/vars/variable.h"
 
+#include <atomic>
+
 namespace orvan {
 
 bool s_started = false;
@@ -39,6 +41,11 @@ void LSMacroVariable::WriteToStream(xostream& os) const {
 }
 
 void LSMacroVariable::WriteValue(xostream& os) const { os << GetSubstitutionString(); }
+
+std::uint64_t LSMacroVariable::NextIdentity() {
+    static std::atomic<std::uint64_t> next{1};
+    return next.fetch_add(1, std::memory_order_relaxed);
+}
 
 xostream& operator<<(xostream& os, const LSMacroVariable& m) {
     m.WriteNameAndFormalParameterList(os);

@@ -94,6 +94,12 @@ public:
     VarFrame* context;  // the frame a body is expanded under; null: the invoker's frame
     int64 indent = -1;
     StringX substitution;
+    // Distinct for every macro the process makes and never reused, unlike an address: what a cache learns
+    // of one macro cannot be taken for a later one.
+    const std::uint64_t identity = NextIdentity();
+
+private:
+    static std::uint64_t NextIdentity();
 };
 
 xostream& operator<<(xostream& os, const LSMacroVariable& m);
