@@ -59,7 +59,7 @@ constexpr std::array<bool, 256> kIdentifierBytes = MakeIdentifierBytes();
 
 // The end of the identifier bytes that begin at p. Words end at unpredictable lengths, so a byte-by-byte loop
 // costs a mispredicted branch per word; sixteen bytes are classified at once where that many are left.
-const char* EndOfIdentifier(const char* p, const char* end) {
+[[gnu::always_inline]] inline const char* EndOfIdentifier(const char* p, const char* end) {
 #if defined(__SSE2__)
     while (end - p >= 16) {
         const __m128i x = _mm_loadu_si128(reinterpret_cast<const __m128i*>(p));
