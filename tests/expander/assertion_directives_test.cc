@@ -11,12 +11,8 @@ namespace {
 
 using testing::ExpandText;
 using testing::MessageOf;
+using testing::NoImports;
 using testing::OffsetIn;
-
-class NoImports : public ImportHandler {
-public:
-    bool HandleImport(VarFrame*, const basic_xstring&, const char*) override { return false; }
-};
 
 struct PassCase {
     const char* name;

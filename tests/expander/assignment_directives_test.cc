@@ -11,13 +11,8 @@ namespace {
 
 using testing::ExpandText;
 using testing::MessageOf;
+using testing::NoImports;
 using testing::OffsetIn;
-
-// Dollar definitions are directives only for an expansion that has an import handler.
-class NoImports : public ImportHandler {
-public:
-    bool HandleImport(VarFrame*, const basic_xstring&, const char*) override { return false; }
-};
 
 struct LayoutCase {
     const char* name;

@@ -17,28 +17,8 @@
 namespace orvan {
 namespace {
 
+using orvan::testing::ExactBuffer;
 using orvan::testing::MessageOf;
-
-// A copy of a text in a heap buffer of exactly its size, so that AddressSanitizer reports any read past its
-// end, and so that every output position can be checked to map into it.
-class ExactBuffer {
-  public:
-    explicit ExactBuffer(std::string_view text) : data_(new char[text.size()]), size_(text.size()) {
-        if (!text.empty()) std::memcpy(data_.get(), text.data(), text.size());
-    }
-    BasicSubString view() const { return BasicSubString(data_.get(), data_.get() + size_); }
-    // The offset of p in the buffer; -1 for null, -2 for an address outside it.
-    int64 Offset(const char* p) const {
-        if (!p) return -1;
-        const std::less<const char*> lt;
-        if (lt(p, data_.get()) || lt(data_.get() + size_, p)) return -2;
-        return p - data_.get();
-    }
-
-  private:
-    std::unique_ptr<char[]> data_;
-    size_t size_;
-};
 
 struct Expansion {
     std::string out;

@@ -15,22 +15,8 @@
 namespace orvan {
 namespace {
 
+using orvan::testing::ExactBuffer;
 using orvan::testing::MessageOf;
-
-// A copy of a text in a heap buffer of exactly its size, so that AddressSanitizer reports any read past its
-// end.
-class ExactBuffer {
-  public:
-    explicit ExactBuffer(std::string_view text) : data_(new char[text.size()]), size_(text.size()) {
-        if (!text.empty()) std::memcpy(data_.get(), text.data(), text.size());
-    }
-    BasicSubString view() const { return BasicSubString(data_.get(), data_.get() + size_); }
-    int64 Offset(const char* p) const { return p - data_.get(); }
-
-  private:
-    std::unique_ptr<char[]> data_;
-    size_t size_;
-};
 
 std::string Str(BasicSubString s) {
     return std::string(s.view());

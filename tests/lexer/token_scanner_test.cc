@@ -17,23 +17,8 @@
 namespace orvan {
 namespace {
 
+using orvan::testing::ExactBuffer;
 using orvan::testing::MessageOf;
-
-// A copy of a text in a heap buffer of exactly its size, so that AddressSanitizer reports any read past its
-// end.
-class ExactBuffer {
-  public:
-    explicit ExactBuffer(std::string_view text) : data_(new char[text.size()]), size_(text.size()) {
-        if (!text.empty()) std::memcpy(data_.get(), text.data(), text.size());
-    }
-    BasicSubString view() const { return BasicSubString(data_.get(), data_.get() + size_); }
-    int64 Offset(const char* p) const { return p - data_.get(); }
-    int64 size() const { return static_cast<int64>(size_); }
-
-  private:
-    std::unique_ptr<char[]> data_;
-    size_t size_;
-};
 
 struct Tok {
     EToken type;

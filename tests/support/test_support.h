@@ -1,9 +1,12 @@
 // Helpers shared by the test programs: running the ovmacro tool, temporary directories, exception capture.
 #pragma once
 
+#include <cstring>
 #include <filesystem>
 #include <functional>
+#include <memory>
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include "ovmacro/expander/import_handler.h"
@@ -58,5 +61,33 @@ std::string ExpandText(const std::string& text, ImportHandler* handler = nullptr
 // Expands text with ExpandText and expects it to fail with `message` at the position `at` names (see
 // OffsetOf; `last`: its last occurrence).
 void ExpectErrorAt(const std::string& text, const std::string& message, const char* at, bool last = false);
+
+// A copy of a text in a heap buffer of exactly its size, so that AddressSanitizer reports any read past its
+// end, and so that positions can be checked to point into it.
+class ExactBuffer {
+public:
+    explicit ExactBuffer(std::string_view text) : data_(new char[text.size()]), size_(text.size()) {
+        if (!text.empty()) std::memcpy(data_.get(), text.data(), text.size());
+    }
+    BasicSubString view() const { return BasicSubString(data_.get(), data_.get() + size_); }
+    int64 size() const { return static_cast<int64>(size_); }
+    // The offset of p in the buffer (its end included); -1 for null, -2 for an address outside it.
+    int64 Offset(const char* p) const {
+        if (!p) return -1;
+        const std::less<const char*> lt;
+        if (lt(p, data_.get()) || lt(data_.get() + size_, p)) return -2;
+        return p - data_.get();
+    }
+
+private:
+    std::unique_ptr<char[]> data_;
+    size_t size_;
+};
+
+// An import handler that refuses every import: with it, an expansion reads dollar definitions as directives.
+class NoImports : public ImportHandler {
+public:
+    bool HandleImport(VarFrame*, const basic_xstring&, const char*) override { return false; }
+};
 
 }  // namespace orvan::testing
