@@ -1,9 +1,12 @@
 #include "support/test_support.h"
 
 #include <gtest/gtest.h>
+#include <pthread.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <csignal>
+#include <algorithm>
 #include <cstdio>
 #include <fstream>
 #include <random>
@@ -31,10 +34,13 @@ std::string ReadFd(int fd) {
 }  // namespace
 
 ToolResult RunTool(const std::vector<std::string>& args, const std::string& input, const std::string& workingDir) {
+    // A tool that does not read all of its standard input must not end the test with SIGPIPE.
+    ::signal(SIGPIPE, SIG_IGN);
     int inPipe[2], outPipe[2], errPipe[2];
     if (::pipe(inPipe) || ::pipe(outPipe) || ::pipe(errPipe)) return {};
     const pid_t pid = ::fork();
     if (pid == 0) {
+        ::signal(SIGPIPE, SIG_DFL);
         ::dup2(inPipe[0], 0);
         ::dup2(outPipe[1], 1);
         ::dup2(errPipe[1], 2);
@@ -118,18 +124,27 @@ std::string MessageOf(const std::function<void()>& fn) {
     return MessageOf(fn, ignored);
 }
 
-int64 OffsetOf(const std::string& text, const char* marker, bool last) {
-    if (std::string(marker) == kAtEnd) return static_cast<int64>(text.size());
-    const size_t at = last ? text.rfind(marker) : text.find(marker);
-    EXPECT_NE(at, std::string::npos) << "marker " << marker << " not in " << text;
-    return static_cast<int64>(at);
-}
-
 int64 OffsetIn(const std::string& text, const char* p) {
     const auto begin = reinterpret_cast<std::uintptr_t>(text.data());
     const auto pos = reinterpret_cast<std::uintptr_t>(p);
     if (!p || pos < begin || pos > begin + text.size()) return -1;
     return static_cast<int64>(pos - begin);
+}
+
+std::string LineColumn(const std::string& text, const char* p) {
+    const int64 offset = OffsetIn(text, p);
+    if (offset < 0) return "-";
+    const size_t lineStart = text.rfind('\n', offset == 0 ? 0 : static_cast<size_t>(offset) - 1);
+    const size_t column = lineStart == std::string::npos || offset == 0 ? static_cast<size_t>(offset) + 1
+                                                                          : static_cast<size_t>(offset) - lineStart;
+    const auto line = std::count(text.begin(), text.begin() + offset, '\n') + 1;
+    return std::to_string(line) + ":" + std::to_string(column);
+}
+
+std::string ErrorIn(const std::string& text, const std::function<void()>& fn) {
+    const char* position = nullptr;
+    const std::string message = MessageOf(fn, position);
+    return LineColumn(text, position) + " " + message;
 }
 
 std::string ExpandIn(VarFrame& frame, const std::string& text, ImportHandler* handler) {
@@ -143,11 +158,34 @@ std::string ExpandText(const std::string& text, ImportHandler* handler) {
     return ExpandIn(frame, text, handler);
 }
 
+std::string ExpansionError(const std::string& text) {
+    return ErrorIn(text, [&] { ExpandText(text); });
+}
+
+int64 OffsetOf(const std::string& text, const char* marker, bool last) {
+    if (std::string(marker) == kAtEnd) return static_cast<int64>(text.size());
+    const size_t at = last ? text.rfind(marker) : text.find(marker);
+    return static_cast<int64>(at);
+}
+
 void ExpectErrorAt(const std::string& text, const std::string& message, const char* at, bool last) {
-    SCOPED_TRACE(::testing::PrintToString(text));
     const char* position = nullptr;
     EXPECT_EQ(MessageOf([&] { ExpandText(text); }, position), message);
     EXPECT_EQ(OffsetIn(text, position), OffsetOf(text, at, last));
+}
+
+void RunOnStackOf(size_t bytes, const std::function<void()>& fn) {
+    pthread_attr_t attr;
+    ASSERT_EQ(pthread_attr_init(&attr), 0);
+    ASSERT_EQ(pthread_attr_setstacksize(&attr, bytes), 0);
+    pthread_t thread;
+    const auto body = [](void* arg) -> void* {
+        (*static_cast<const std::function<void()>*>(arg))();
+        return nullptr;
+    };
+    ASSERT_EQ(pthread_create(&thread, &attr, body, const_cast<std::function<void()>*>(&fn)), 0);
+    pthread_attr_destroy(&attr);
+    ASSERT_EQ(pthread_join(thread, nullptr), 0);
 }
 
 }  // namespace orvan::testing

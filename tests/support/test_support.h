@@ -7,6 +7,7 @@
 #include <memory>
 #include <string>
 #include <string_view>
+#include <utility>
 #include <vector>
 
 #include "ovmacro/expander/import_handler.h"
@@ -47,20 +48,41 @@ std::string MessageOf(const std::function<void()>& fn);
 // The same, also giving the exception's position.
 std::string MessageOf(const std::function<void()>& fn, const char*& position);
 
-// Marks the end of a text where a test names a position by a piece of text (see OffsetOf).
-inline constexpr const char* kAtEnd = "\x01<end>";
-// The offset of the first (or, with `last`, the last) occurrence of `marker` in text; kAtEnd: the text's size.
-int64 OffsetOf(const std::string& text, const char* marker, bool last = false);
 // The offset of p in text, or -1 when p does not point into it (or just past its end).
 int64 OffsetIn(const std::string& text, const char* p);
+// "LINE:COLUMN" of p in text, both from 1 (a column counts bytes), as the golden cases write places; "-" when
+// p lies outside the text.
+std::string LineColumn(const std::string& text, const char* p);
+// Runs fn and returns "LINE:COLUMN MESSAGE" of the LexScannerException it raises, its place taken in text;
+// fails the test when it raises none.
+std::string ErrorIn(const std::string& text, const std::function<void()>& fn);
 // Expands text (which must outlive the frame's definitions) in frame, into a string, with the given import
 // handler (none by default).
 std::string ExpandIn(VarFrame& frame, const std::string& text, ImportHandler* handler = nullptr);
 // Expands text in a fresh file-scope frame.
 std::string ExpandText(const std::string& text, ImportHandler* handler = nullptr);
-// Expands text with ExpandText and expects it to fail with `message` at the position `at` names (see
-// OffsetOf; `last`: its last occurrence).
+// ErrorIn of expanding text in a fresh file-scope frame.
+std::string ExpansionError(const std::string& text);
+
+// Transitional: removed once no test states positions by markers.
+inline constexpr const char* kAtEnd = "\x01<end>";
+int64 OffsetOf(const std::string& text, const char* marker, bool last = false);
 void ExpectErrorAt(const std::string& text, const std::string& message, const char* at, bool last = false);
+
+// Runs fn on a new thread with a stack of `bytes` (1 MiB is the smallest that hosts commonly give).
+void RunOnStackOf(size_t bytes, const std::function<void()>& fn);
+
+// Runs `undo` when the scope ends, so that a limit lowered for one test is restored even when it fails.
+class Finally {
+public:
+    explicit Finally(std::function<void()> undo) : undo_(std::move(undo)) {}
+    ~Finally() { undo_(); }
+    Finally(const Finally&) = delete;
+    Finally& operator=(const Finally&) = delete;
+
+private:
+    std::function<void()> undo_;
+};
 
 // A copy of a text in a heap buffer of exactly its size, so that AddressSanitizer reports any read past its
 // end, and so that positions can be checked to point into it.

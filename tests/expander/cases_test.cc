@@ -1,0 +1,4 @@
+// The golden cases of this folder (*_cases.txt), each run through ovmacro.
+#include "support/golden.h"
+
+OVMACRO_GOLDEN_CASES(expander);
