@@ -1,0 +1,48 @@
+// The ovmacro runs that the case files cannot state: arguments with blanks or line feeds, outputs known only
+// by their form, and the shipped example.
+#include <gtest/gtest.h>
+
+#include <regex>
+#include <string>
+#include <vector>
+
+#include "support/test_support.h"
+
+namespace orvan {
+namespace {
+
+using testing::RunTool;
+using testing::ToolResult;
+
+TEST(OvmacroTool, ArgumentsThatCaseFilesCannotSpell) {
+    const struct {
+        std::vector<std::string> args;
+        int exitCode;
+        std::string out;  // a pattern
+        std::string err;
+    } cases[] = {
+        // --help and --version read no file, whatever follows them.
+        {{"--help", "missing.txt"}, 0, R"(Usage: ovmacro \[OPTIONS\] \[FILE\]\n[\s\S]*)", ""},
+        {{"-h"}, 0, R"(Usage: ovmacro [\s\S]*)", ""},
+        {{"--version", "missing.txt"}, 0, R"(ovmacro \d+\.\d+\.\d+\n)", ""},
+        {{"-D", "X=a  b", "-D", "Y=(X, X)"}, 0, R"(a  b \(a  b, a  b\)\n)", ""},
+        {{"-D", "X=a\nb"}, 2, "", "ovmacro: -D text must be a single line: X\nTry 'ovmacro --help'.\n"},
+    };
+    for (const auto& c : cases) {
+        SCOPED_TRACE(c.args[0] + " " + c.args.back());
+        const ToolResult r = RunTool(c.args, "X Y\n");
+        EXPECT_EQ(r.exitCode, c.exitCode);
+        EXPECT_TRUE(std::regex_match(r.out, std::regex(c.out))) << r.out;
+        EXPECT_EQ(r.err, c.err);
+    }
+}
+
+TEST(OvmacroTool, CppTableExampleGivesItsExpectedHeader) {
+    const std::string dir = std::string(OVMACRO_SOURCE_DIR) + "/examples/";
+    const ToolResult r = RunTool({dir + "cpp_table.ovm"});
+    EXPECT_EQ(r.exitCode, 0) << r.err;
+    EXPECT_EQ(r.out, testing::ReadFile(dir + "cpp_table.expected.h"));
+}
+
+}  // namespace
+}  // namespace orvan
