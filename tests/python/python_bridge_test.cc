@@ -1,240 +1,99 @@
-// The Python bridge called directly: values as text, error messages, stream redirection, restarts.
+// The Python bridge called directly: values as text, errors, the error stream, start, stop and refusal.
 #include "ovmacro/python/python_bridge.h"
 
 #include <gtest/gtest.h>
 
 #include <string>
 
-#include "python/capture_stdout.h"
 #include "support/test_support.h"
 
 namespace orvan {
 namespace {
 
-using testing::CaptureStdout;
-using testing::MessageOf;
+using namespace std::string_literals;
 
 const char kSource[] = "the caller's text";
 const char* const kPos = kSource + 4;
 
-class PythonBridgeTest : public ::testing::Test {
-protected:
-    void SetUp() override { SetPythonAllowed(true); }
-    void TearDown() override {
-        SetPythonAllowed(true);
-        UninitPython();
-    }
-};
-
-std::string Eval(const std::string& expression) {
-    basic_xstring result = "stale";
-    EvalPythonExpression(expression, result, kPos);
-    return result;
+// Each test ends with Python allowed and no interpreter running.
+void Reset() {
+    SetPythonAllowed(true);
+    UninitPython();
 }
 
-bool StartsWith(const std::string& text, const std::string& prefix) {
-    return text.rfind(prefix, 0) == 0;
-}
-
-TEST_F(PythonBridgeTest, ValuesAreWrittenAsText) {
-    RunPython("",
-              "I = type('I', (int,), {})\nF = type('F', (float,), {})\n"
-              "S = type('S', (str,), {})\nL = type('L', (list,), {})\n",
-              kPos);
-    const struct {
-        const char* expression;
-        std::string text;
-    } cases[] = {
-        {"True", "1"},
-        {"False", "0"},
-        {"-7", "-7"},
-        {"2**32", "4294967296"},
-        {"2**63-1", "9223372036854775807"},
-        {"-2**63", "-9223372036854775808"},
-        {"2**64", "18446744073709551616"},
-        {"-2**64-1", "-18446744073709551617"},
-        {"10**27", "1000000000000000000000000000"},
-        {"10**5000", "1" + std::string(5000, '0')},
-        {"2.5", "2.5"},
-        {"3.0", "3.0"},
-        {"-1e20", "-1e+20"},
-        {"'ab'", "ab"},
-        {"''", ""},
-        {"'a\\x00b'", "a"},
-        {"'\\u00e9'", "\xc3\xa9"},
-        {"[1, 'a', [2]]", "[1,a,[2]]"},
-        {"[]", "[]"},
-        {"[True, 2.5, [[]], 2**70]", "[1,2.5,[[]],1180591620717411303424]"},
-        {"I(5)", "5"},
-        {"F(0.5)", "0.5"},
-        {"S('s')", "s"},
-        {"L([1, 2])", "[1,2]"},
-    };
-    for (const auto& c : cases) EXPECT_EQ(Eval(c.expression), c.text) << c.expression;
-}
-
-TEST_F(PythonBridgeTest, BigIntsMatchPythonsOwnDecimalText) {
-    for (const char* value : {"7**1000", "-(13**777)", "2**4096 - 1"})
-        EXPECT_EQ(Eval(value), Eval(std::string("str(") + value + ")")) << value;
-}
-
-TEST_F(PythonBridgeTest, UnconvertibleValuesRaiseAtTheCallersPosition) {
-    RunPython("", "selfish = []\nselfish.append(selfish)\ndeep = []\nfor i in range(2000): deep = [deep]\n",
-              kPos);
-    const struct {
-        const char* expression;
-        const char* message;
-    } cases[] = {
-        {"None", "Can't convert python result of type NoneType"},
-        {"(1, 2)", "Can't convert python result of type tuple"},
-        {"b'x'", "Can't convert python result of type bytes"},
-        {"{}", "Can't convert python result of type dict"},
-        {"1j", "Can't convert python result of type complex"},
-        {"[1, None]", "Can't convert python result of type NoneType"},
-        {"selfish", "Can't convert python result: a list that contains itself"},
-        {"deep", "Can't convert python result: lists nested more than 1000 deep"},
-    };
-    for (const auto& c : cases) {
-        const char* position = nullptr;
-        basic_xstring result = "kept";
-        EXPECT_EQ(MessageOf([&] { EvalPythonExpression(c.expression, result, kPos); }, position), c.message)
-            << c.expression;
-        EXPECT_EQ(position, kPos) << c.expression;
-        EXPECT_EQ(result, "kept") << c.expression;
-    }
-    // A string that has no UTF-8 form carries Python's reason.
-    const std::string message = MessageOf([] { Eval("'\\ud800'"); });
-    EXPECT_TRUE(StartsWith(message, "Can't convert python result of type str : ")) << message;
-    EXPECT_NE(message.find("UnicodeEncodeError"), std::string::npos) << message;
-}
-
-TEST_F(PythonBridgeTest, ErrorsCarryTheirPrefixAndPythonsTraceback) {
-    const struct {
-        bool run;  // RunPython, else EvalPythonExpression
-        const char* code;
-        const char* prefix;
-        const char* detail;
-    } cases[] = {
-        {false, "undefined_name", "Eval python error: ", "NameError: name 'undefined_name' is not defined"},
-        {false, "1/0", "Eval python error: ", "ZeroDivisionError"},
-        {false, "1 +", "Eval python error: ", "SyntaxError"},
-        {false, "x = 1", "Eval python error: ", "SyntaxError"},
-        {true, "x = (\n", "Python compilation error: ", "SyntaxError"},
-        {true, "  x = 1\n", "Python compilation error: ", "IndentationError"},
-        {true, "raise ValueError('boom')\n", "RunPython error: ", "ValueError: boom"},
-        // sys.exit() must not end the host process.
-        {true, "import sys\nsys.exit(3)\n", "RunPython error: ", "SystemExit: 3"},
-    };
-    for (const auto& c : cases) {
-        const char* position = nullptr;
-        const std::string message = MessageOf(
-            [&] {
-                basic_xstring result;
-                if (c.run)
-                    RunPython("", c.code, kPos);
-                else
-                    EvalPythonExpression(c.code, result, kPos);
-            },
-            position);
-        EXPECT_TRUE(StartsWith(message, c.prefix)) << c.code << "\n" << message;
-        EXPECT_NE(message.find(c.detail), std::string::npos) << c.code << "\n" << message;
-        EXPECT_EQ(position, kPos) << c.code;
-        // The error indicator is cleared: the interpreter stays usable.
-        RunPython("", "after = 5\n", kPos);
-        EXPECT_EQ(Eval("after + 1"), "6") << c.code;
+// Evaluates an expression, or runs the statements after "run:": the value as text, or "! " and the message
+// of the error raised at kPos ("!elsewhere " when raised at another place).
+std::string Python(const std::string& code) {
+    try {
+        basic_xstring result;
+        if (code.rfind("run:", 0) == 0) RunPython("", code.substr(4), kPos);
+        if (code.rfind("run:", 0) != 0) EvalPythonExpression(code, result, kPos);
+        return result;
+    } catch (const LexScannerException& e) {
+        return (e.GetPosition() == kPos ? "! " : "!elsewhere ") + std::string(e.GetMessage());
     }
 }
-
-TEST_F(PythonBridgeTest, CodeWithZeroByteIsRefusedNotCutShort) {
-    const std::string code("ok = 1\0ok = 2\n", 14);
-    EXPECT_EQ(MessageOf([&] { RunPython("", code, kPos); }),
-              "Python compilation error: source code string cannot contain null bytes");
-    EXPECT_EQ(MessageOf([&] { Eval(std::string("1\0+1", 4)); }),
-              "Eval python error: source code string cannot contain null bytes");
+// Whether text matches "BEGIN...PART": it begins with BEGIN, and PART follows; without "..." it is the text.
+bool Matches(const std::string& text, const std::string& pattern) {
+    const size_t dots = pattern.find("...");
+    if (dots == std::string::npos) return text == pattern;
+    return text.rfind(pattern.substr(0, dots), 0) == 0 &&
+           text.find(pattern.substr(dots + 3), dots) != text.npos;
 }
 
-TEST_F(PythonBridgeTest, NamesPersistInMainAcrossCalls) {
-    RunPython("", "def twice(v):\n    return 2 * v\nx = 6*7\n", kPos);
-    RunPython("first.py", "y = twice(x)\n", kPos);
-    EXPECT_EQ(Eval("y"), "84");
-    EXPECT_EQ(Eval("[x, twice('ab')]"), "[42,abab]");
+// In order, in one interpreter: each error leaves it usable for the rows after it.
+TEST(PythonBridge, ValuesAsTextAndErrors) {
+    const testing::Finally reset(Reset);
+    const std::pair<std::string, std::string> cases[] = {
+        {"run:selfish = []\nselfish.append(selfish)\ndeep = []\nfor i in range(999): deep = [deep]\n", ""},
+        {"[-1, -2**63, 2.5, [[]] * 2, 2**64, '', 'a\\x00b']",
+         "[-1,-9223372036854775808,2.5,[[],[]],18446744073709551616,,a]"},
+        {"deep", std::string(1000, '[') + std::string(1000, ']')},
+        {"[deep]", "! Can't convert python result: lists nested more than 1000 deep"},
+        {"selfish", "! Can't convert python result: a list that contains itself"},
+        {"[1, None]", "! Can't convert python result of type NoneType"},
+        {"'\\ud800'", "! Can't convert python result of type str : ...UnicodeEncodeError"},
+        {"undefined", "! Eval python error: Traceback...NameError: name 'undefined' is not defined"},
+        {"1\0+1"s, "! Eval python error: source code string cannot contain null bytes"},
+        {"run:x = (\n", "! Python compilation error: ...SyntaxError"},
+        {"run:ok = 1\0ok = 2\n"s, "! Python compilation error: source code string cannot contain null bytes"},
+        {"run:raise ValueError('boom')\n", "! RunPython error: Traceback...ValueError: boom"},
+        {"run:import sys\nsys.exit(3)\n", "! RunPython error: ...SystemExit: 3"},  // the host goes on
+    };
+    for (const auto& [code, expected] : cases) EXPECT_TRUE(Matches(Python(code), expected)) << Python(code);
+    for (const char* big : {"7**1000", "-(13**777)", "2**4096 - 1"})
+        EXPECT_EQ(Python(big), Python("str("s + big + ")")) << "as Python writes it";
 }
 
-TEST_F(PythonBridgeTest, PrintGoesToStandardOutput) {
-    CaptureStdout capture;
-    RunPython("",
-              "print('hello', 42)\nimport sys\nsys.stdout.write('no newline')\nprint('|', flush=True)\n"
-              "print('a\\0b')\n",
-              kPos);
-    EXPECT_EQ(capture.Finish(), std::string("hello 42\nno newline|\na\0b\n", 25));
-}
-
-TEST_F(PythonBridgeTest, StandardErrorIsCollectedUntilTheNextError) {
-    RunPython("", "import sys\nsys.stderr.write('warn')\n", kPos);
-    EXPECT_EQ(s_errorString.str(), "warn");
-    basic_xstring text = "stale";
-    EXPECT_FALSE(GetPythonError(text));  // nothing pending
-    EXPECT_EQ(text, "");
-    // The next error replaces the collected text by its own traceback.
-    const std::string message = MessageOf([] { RunPython("", "raise KeyError('k')\n", kPos); });
-    EXPECT_EQ(message.find("warn"), std::string::npos) << message;
-    EXPECT_EQ(s_errorString.str(), "");
-}
-
-TEST_F(PythonBridgeTest, NothingRunsWithoutAnInterpreter) {
-    basic_xstring text = "stale";
-    EXPECT_FALSE(GetPythonError(text));
-    EXPECT_EQ(text, "");
-    basic_xstring error;
+TEST(PythonBridge, StartStopRestartAndRefusal) {
+    const testing::Finally reset(Reset);
+    basic_xstring pending = "stale", error;
+    EXPECT_FALSE(GetPythonError(pending)) << "no interpreter, nothing pending";
     EXPECT_EQ(ExecutePythonExpression("1", error), nullptr);
     EXPECT_EQ(error, "the Python interpreter is not running");
-    UninitPython();  // without a previous start
-    UninitPython();
-}
-
-TEST_F(PythonBridgeTest, ExecutePythonExpressionHandsOverANewReference) {
-    basic_xstring error;
-    ASSERT_TRUE(InitPython(error));
-    ASSERT_TRUE(InitPython(error));  // a second start-up is a no-op
-    PyObjectRef value(ExecutePythonExpression("[1, 'z']", error));
-    ASSERT_TRUE(value);
-    StringStream os;
-    WritePythonObject(os, value.Get(), kPos);
-    EXPECT_EQ(os.GetString(), "[1,z]");
-    PyObjectRef failed(ExecutePythonExpression("nope", error));
-    EXPECT_FALSE(failed);
-    EXPECT_NE(error.find("NameError"), std::string::npos) << error;
-}
-
-TEST_F(PythonBridgeTest, RestartGivesAFreshInterpreterWithItsStreamsRedirected) {
-    RunPython("", "gone = 1\n", kPos);
-    UninitPython();
-    UninitPython();
-    EXPECT_NE(MessageOf([] { Eval("gone"); }).find("NameError"), std::string::npos);
-    CaptureStdout capture;
-    RunPython("", "print('again')\n", kPos);
-    EXPECT_EQ(capture.Finish(), "again\n");
-}
-
-TEST_F(PythonBridgeTest, DisabledPythonRefusesEveryUse) {
-    const std::string disabled = "Python initialisation error: Python is disabled";
+    UninitPython();  // without a start
+    // Each start is a fresh interpreter whose standard error is kept until the next error, whose traceback
+    // replaces it; an error does not keep it from stopping and starting again.
+    for (int i = 0; i < 4; ++i) {
+        EXPECT_EQ(Python("'n' in globals()"), "0");
+        EXPECT_EQ(Python("run:import sys\nsys.stderr.write('warn')\nn = 1\n"), "");
+        EXPECT_EQ(s_errorString.str(), "warn");
+        EXPECT_FALSE(GetPythonError(pending));
+        EXPECT_EQ(pending, "");
+        const std::string traceback = Python("run:1 / 0");
+        EXPECT_TRUE(Matches(traceback, "! RunPython error: Traceback...ZeroDivisionError")) << traceback;
+        EXPECT_EQ(traceback.find("warn"), std::string::npos) << traceback;
+        UninitPython();
+    }
+    // Refused while disallowed, without stopping a running interpreter.
+    EXPECT_EQ(Python("run:kept = 3\n"), "");
     SetPythonAllowed(false);
-    EXPECT_FALSE(IsPythonAllowed());
-    basic_xstring error;
     EXPECT_FALSE(InitPython(error));
     EXPECT_EQ(error, "Python is disabled");
-    const char* position = nullptr;
-    EXPECT_EQ(MessageOf([] { RunPython("", "x = 1\n", kPos); }, position), disabled);
-    EXPECT_EQ(position, kPos);
-    EXPECT_EQ(MessageOf([] { Eval("1"); }), disabled);
-
-    // Allowed again, it starts; switched off while running, it refuses without stopping the interpreter.
+    for (const char* code : {"kept", "run:x = 1\n"})
+        EXPECT_EQ(Python(code), "! Python initialisation error: Python is disabled");
     SetPythonAllowed(true);
-    RunPython("", "kept = 3\n", kPos);
-    SetPythonAllowed(false);
-    EXPECT_EQ(MessageOf([] { Eval("kept"); }), disabled);
-    SetPythonAllowed(true);
-    EXPECT_EQ(Eval("kept"), "3");
+    EXPECT_EQ(Python("kept"), "3");
 }
 
 }  // namespace
