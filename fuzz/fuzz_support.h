@@ -8,11 +8,26 @@
 #include <cstdlib>
 #include <string>
 
+#include "ovmacro/expander/nesting_guard.h"
 #include "ovmacro/foundations/sub_string.h"
+#include "ovmacro/python/python_bridge.h"
+#include "ovmacro/vars/var_frame.h"
 
 // Inputs longer than this are ignored. Every construct of the language fits in a few hundred bytes, and a
 // short input keeps each run fast, so that the fuzzer spends its time on variety instead of bulk.
 inline constexpr size_t kMaxFuzzInputSize = 4096;
+
+// Bounds the work that the language leaves unbounded, once per process, for the targets that expand texts: no
+// Python (no interpreter in fuzzing), expansions nested at most 64 deep, each outermost expansion at most 4000
+// nested expansions (every @while iteration and its condition, every @for item and macro call counts) and
+// 256 KiB written, dollar macro replacement stopped at 64 KiB. Past a bound the expansion fails like any other.
+inline bool ConfigureFuzzBounds() {
+    orvan::SetPythonAllowed(false);
+    orvan::MacroNestingGuard::SetDepthLimitForTesting(64);
+    orvan::MacroNestingGuard::SetWorkLimitsForTesting(4000, 1 << 18);
+    orvan::FileScopeVarFrame::SetDollarMacroTextLimitForTesting(1 << 16);
+    return true;
+}
 
 // Stops the run, as a crash that libFuzzer saves, when an invariant of the library does not hold.
 #define FUZZ_CHECK(condition)                                                                      \

@@ -7,11 +7,7 @@
 // frame then imports (again at every further import of it). An import of a file whose expansion is still
 // running is refused, as a host refuses import cycles.
 //
-// Work that the language leaves unbounded is bounded here: the input is at most 4 KiB; Python is switched
-// off (no interpreter in fuzzing); expansions nest at most kFuzzDepthLimit levels; an outermost expansion may
-// run kFuzzExpansionLimit nested expansions (every @while iteration and its condition, every @for item and
-// macro invocation counts) and write kFuzzOutputLimit characters in all; dollar macro replacement stops at
-// kFuzzDollarTextLimit characters. Past a bound the expansion fails like any other, with an IException.
+// Work that the language leaves unbounded is bounded (ConfigureFuzzBounds), and the input is at most 4 KiB.
 //
 // Checked besides crashes: the output pieces tile the expanded text exactly, each copied piece holds the
 // characters of a live source, both mappers of output positions agree, and an error that reaches the host
@@ -21,27 +17,13 @@
 
 #include "fuzz_support.h"
 #include "ovmacro/expander/macro_expander.h"
-#include "ovmacro/expander/nesting_guard.h"
 #include "ovmacro/output/output_pieces.h"
-#include "ovmacro/python/python_bridge.h"
 
 using namespace orvan;
 
 namespace {
 
 constexpr size_t kMaxFiles = 8;
-constexpr int64 kFuzzDepthLimit = 64;
-constexpr int64 kFuzzExpansionLimit = 4000;
-constexpr int64 kFuzzOutputLimit = 1 << 18;
-constexpr int64 kFuzzDollarTextLimit = 1 << 16;
-
-void ConfigureBounds() {
-    SetPythonAllowed(false);
-    MacroNestingGuard::SetDepthLimitForTesting(kFuzzDepthLimit);
-    MacroNestingGuard::SetWorkLimitsForTesting(kFuzzExpansionLimit, kFuzzOutputLimit);
-    FileScopeVarFrame::SetDollarMacroTextLimitForTesting(kFuzzDollarTextLimit);
-}
-
 class FuzzImportHandler : public ImportHandler {
   public:
     explicit FuzzImportHandler(const std::vector<BasicSubString>& files)
@@ -50,32 +32,27 @@ class FuzzImportHandler : public ImportHandler {
     bool HandleImportPath(const basic_xstring& path, const char*) override { return !path.empty(); }
 
     bool HandleImport(VarFrame* frame, const basic_xstring& fileName, const char*) override {
-        size_t index = 0;
-        if (fileName.empty() || fileName.size() > 2) return false;
-        for (char c : fileName) {
-            if (c < '0' || c > '9') return false;
-            index = index * 10 + static_cast<size_t>(c - '0');
-        }
+        const bool digits = !fileName.empty() && fileName.size() <= 2 &&
+                            fileName.find_first_not_of("0123456789") == basic_xstring::npos;
+        const size_t index = digits ? std::stoul(fileName) : 0;
         if (index == 0 || index >= files_.size() || !frame || !frame->GetFileScopeVarFrame()) return false;
         if (state_[index] == kNotLoaded) {
-            state_[index] = kExpanding;
+            state_[index] = kFailed;  // also while it expands: an import of it then is a cycle
             frames_[index] = std::make_unique<FileScopeVarFrame>();
             basic_xstring expanded;
             try {
                 MacroExpand(this, frames_[index].get(), files_[index], 0, 0, expanded);
+                state_[index] = kLoaded;
             } catch (const LexScannerException&) {
-                state_[index] = kFailed;
-                return false;
             }
-            state_[index] = kLoaded;
         }
-        if (state_[index] != kLoaded) return false;  // failed, or a cycle
+        if (state_[index] != kLoaded) return false;
         frame->GetFileScopeVarFrame()->AddImport(frames_[index].get());
         return true;
     }
 
   private:
-    enum State { kNotLoaded, kExpanding, kLoaded, kFailed };
+    enum State { kNotLoaded, kLoaded, kFailed };
     std::vector<BasicSubString> files_;
     std::vector<std::unique_ptr<FileScopeVarFrame>> frames_;
     std::vector<State> state_;
@@ -84,15 +61,10 @@ class FuzzImportHandler : public ImportHandler {
 void CheckPieces(const basic_xstring& expanded, const OutputPieces& pieces) {
     const auto size = static_cast<int64>(expanded.size());
     FUZZ_CHECK(pieces.size() == size);
-    int64 sum = 0;
-    for (const OutputPiece& p : pieces.GetPieces()) {
-        FUZZ_CHECK(p.source.begin() <= p.source.end() && p.length >= 0);
-        sum += p.size();
-    }
-    FUZZ_CHECK(sum == size);
-    // A copied piece stands for the very characters of its source, which must still be alive.
+    // The pieces tile the text; a copied piece stands for the very characters of its source, still alive.
     int64 at = 0;
     for (const OutputPiece& p : pieces.GetPieces()) {
+        FUZZ_CHECK(p.source.begin() <= p.source.end() && p.length >= 0);
         if (p.IsCopied() && !p.source.empty()) {
             FUZZ_CHECK(!PointsIntoFreedMemory(p.source.begin()) &&
                        !PointsIntoFreedMemory(p.source.end() - 1));
@@ -101,6 +73,7 @@ void CheckPieces(const basic_xstring& expanded, const OutputPieces& pieces) {
         }
         at += p.size();
     }
+    FUZZ_CHECK(at == size);
     if (size == 0) return;
     // Positions in increasing order, up to 64 of them spread over the text, each mapped both ways.
     OutputPiecesMonotonePosMapper mapper(pieces);
@@ -122,7 +95,7 @@ void CheckPieces(const basic_xstring& expanded, const OutputPieces& pieces) {
 }  // namespace
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
-    static const bool configured = (ConfigureBounds(), true);
+    static const bool configured = ConfigureFuzzBounds();
     (void)configured;
     if (size > kMaxFuzzInputSize) return 0;
 

@@ -6,24 +6,14 @@
 // parser as import handler, which records it and resolves no imports) and its expanded text read, so that
 // the reader also meets the positions of an expansion (__LINE__, errors mapped back through the pieces).
 //
-// Work is bounded as in macro_expand_fuzzer.cc: 4 KiB of input, no Python, lowered nesting, expansion, output
-// and dollar replacement bounds.
+// Work is bounded as in macro_expand_fuzzer.cc (ConfigureFuzzBounds, 4 KiB of input).
 #include "fuzz_support.h"
-#include "ovmacro/expander/nesting_guard.h"
 #include "ovmacro/lexer/token_scanner.h"
 #include "ovmacro/mpfw/mpfw_parser.h"
-#include "ovmacro/python/python_bridge.h"
 
 using namespace orvan;
 
 namespace {
-
-void ConfigureBounds() {
-    SetPythonAllowed(false);
-    MacroNestingGuard::SetDepthLimitForTesting(64);
-    MacroNestingGuard::SetWorkLimitsForTesting(4000, 1 << 18);
-    FileScopeVarFrame::SetDollarMacroTextLimitForTesting(1 << 16);
-}
 
 // A host that finds no file to import.
 class FuzzHost : public MpfwParser {
@@ -71,7 +61,7 @@ bool ReadStep(FuzzHost& host) {
 }  // namespace
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
-    static const bool configured = (ConfigureBounds(), true);
+    static const bool configured = ConfigureFuzzBounds();
     (void)configured;
     if (size == 0 || size > kMaxFuzzInputSize) return 0;
     const bool expandFirst = data[0] & 1;

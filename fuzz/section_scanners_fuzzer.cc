@@ -14,19 +14,8 @@ using namespace orvan;
 namespace {
 
 enum Scanner : uint8_t {
-    kArgumentInRound,
-    kArgumentInSquare,
-    kRoundSection,
-    kSquareSectionOpened,
-    kCurlySection,
-    kSubstString,
-    kRndBrackettedString,
-    kElse,
-    kElseIf,
-    kTokenEquivalence,
-    kUnstringify,
-    kTrailingBlanks,
-    kScannerCount
+    kArgumentInRound, kArgumentInSquare, kRoundSection, kSquareSectionOpened, kCurlySection, kSubstString,
+    kRndBrackettedString, kElse, kElseIf, kTokenEquivalence, kUnstringify, kTrailingBlanks, kScannerCount
 };
 
 // Runs one scan; the view `rest` is advanced past what it consumed.
@@ -56,20 +45,13 @@ void ScanOnce(Scanner scanner, BasicSubString input, BasicSubString& rest) {
         case kRndBrackettedString:
             section = ScanRndBrackettedString(rest, indent);
             break;
-        case kElse: {
+        case kElse:
+        case kElseIf: {
             BasicSubString copy = rest;
-            if (ScanElseBlock(copy))
+            if (scanner == kElse ? ScanElseBlock(copy) : ScanElseIfBlock(copy))
                 rest = copy;
             else
                 rest.Advance(1);  // nothing to adopt: move on to try the next position
-            break;
-        }
-        case kElseIf: {
-            BasicSubString copy = rest;
-            if (ScanElseIfBlock(copy))
-                rest = copy;
-            else
-                rest.Advance(1);
             break;
         }
         case kTokenEquivalence: {
@@ -88,8 +70,7 @@ void ScanOnce(Scanner scanner, BasicSubString input, BasicSubString& rest) {
             try {
                 UnstringifyQuotedString(rest, out);
             } catch (const IException&) {
-                FUZZ_CHECK(
-                    out.GetString().empty());  // nothing is written before the whole string was checked
+                FUZZ_CHECK(out.GetString().empty());  // nothing is written before the whole string was checked
                 throw;
             }
             FUZZ_CHECK(static_cast<int64>(out.GetString().size()) < rest.size());

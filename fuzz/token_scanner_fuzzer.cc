@@ -13,24 +13,21 @@ using namespace orvan;
 
 namespace {
 
-// Reads every token; returns false when a scanning error ended the input early.
+// Reads every token but comments; returns false when a scanning error ended the input early.
 bool ScanAll(BasicSubString input, bool returnComments, std::vector<LSToken>& tokens) {
     BasicSubString rest = input;
     const char* previousEnd = input.begin();
     try {
-        for (;;) {
-            const LSToken token = LsScanToken(rest, returnComments);
-            FUZZ_CHECK(ViewWithin(token.text, input));
-            FUZZ_CHECK(token.text.begin() >= previousEnd);
-            FUZZ_CHECK(rest.begin() == token.text.end() && rest.end() == input.end());
-            if (token.type == TK_EOS) {
-                FUZZ_CHECK(token.text.empty() && token.text.begin() == input.end());
+        for (LSToken t = LsScanToken(rest, returnComments);; t = LsScanToken(rest, returnComments)) {
+            FUZZ_CHECK(ViewWithin(t.text, input) && t.text.begin() >= previousEnd);
+            FUZZ_CHECK(rest.begin() == t.text.end() && rest.end() == input.end());
+            if (t.type == TK_EOS) {
+                FUZZ_CHECK(t.text.empty() && t.text.begin() == input.end());
                 return true;
             }
-            FUZZ_CHECK(!token.text.empty());
-            FUZZ_CHECK(returnComments || token.type != TK_COMMENT);
-            previousEnd = token.text.end();
-            tokens.push_back(token);
+            FUZZ_CHECK(!t.text.empty() && (returnComments || t.type != TK_COMMENT));
+            previousEnd = t.text.end();
+            if (t.type != TK_COMMENT) tokens.push_back(t);
         }
     } catch (const IException&) {
         FUZZ_CHECK(ViewWithin(rest, input));
@@ -38,40 +35,25 @@ bool ScanAll(BasicSubString input, bool returnComments, std::vector<LSToken>& to
     }
 }
 
-// Whether the text is exactly one literal character in single quotes, the only kind GetLiteralCharacter
-// takes.
-bool IsOneCharacterLiteral(BasicSubString text) {
-    BasicSubString rest = text;
-    try {
-        return LsScanLiteralCharacter(rest) && rest.empty();
-    } catch (const IException&) {
-        return false;
-    }
-}
-
-void ReadLiteralValues(const LSToken& token) {
+void ReadLiteralValue(const LSToken& token) {
     basic_xstring s;
+    BasicSubString rest = token.text;
     switch (token.type) {
-        case TK_INT:
-            (void)token.GetLiteralInt32();
-            (void)token.GetLiteralInt64();
-            break;
-        case TK_HEX_INT:
-            (void)token.GetLiteralHexInt32();
-            (void)token.GetLiteralHexInt64();
-            break;
-        case TK_FLOAT:
-            (void)token.GetLiteralDouble();
-            break;
+        case TK_INT: (void)token.GetLiteralInt32(), (void)token.GetLiteralInt64(); break;
+        case TK_HEX_INT: (void)token.GetLiteralHexInt32(), (void)token.GetLiteralHexInt64(); break;
+        case TK_FLOAT: (void)token.GetLiteralDouble(); break;
         case TK_SQ_STRING:
         case TK_DQ_STRING:
             token.GetLiteralString(s);
             FUZZ_CHECK(static_cast<int64>(s.size()) <= token.text.size());
-            if (token.type == TK_SQ_STRING && IsOneCharacterLiteral(token.text))
-                (void)token.GetLiteralCharacter();
+            // GetLiteralCharacter takes exactly one literal character in single quotes.
+            try {
+                if (token.type == TK_SQ_STRING && LsScanLiteralCharacter(rest) && rest.empty())
+                    (void)token.GetLiteralCharacter();
+            } catch (const IException&) {
+            }
             break;
-        default:
-            break;
+        default: break;
     }
 }
 
@@ -81,25 +63,16 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     if (size > kMaxFuzzInputSize) return 0;
     const char* text = reinterpret_cast<const char*>(data);
     const BasicSubString input(text, text + size);
-
     std::vector<LSToken> withComments, withoutComments;
-    const bool completeWith = ScanAll(input, true, withComments);
-    const bool completeWithout = ScanAll(input, false, withoutComments);
-    FUZZ_CHECK(completeWith == completeWithout);
-    std::vector<LSToken> filtered;
-    for (const LSToken& t : withComments)
-        if (t.type != TK_COMMENT) filtered.push_back(t);
-    if (completeWith) FUZZ_CHECK(filtered == withoutComments);
-    for (const LSToken& t : withoutComments) ReadLiteralValues(t);
-
-    // The single-token scanners on their own, at the start of the input.
-    if (size > 0) {
-        BasicSubString rest = input;
-        try {
-            (void)LsScanLiteralCharacter(rest);
-        } catch (const IException&) {
-        }
-        FUZZ_CHECK(ViewWithin(rest, input));
+    const bool complete = ScanAll(input, true, withComments);
+    FUZZ_CHECK(ScanAll(input, false, withoutComments) == complete);
+    if (complete) FUZZ_CHECK(withComments == withoutComments);
+    for (const LSToken& t : withoutComments) ReadLiteralValue(t);
+    BasicSubString rest = input;
+    try {
+        (void)LsScanLiteralCharacter(rest);
+    } catch (const IException&) {
     }
+    FUZZ_CHECK(ViewWithin(rest, input));
     return 0;
 }
