@@ -13,7 +13,6 @@
 namespace orvan {
 namespace {
 
-using testing::ErrorIn;
 using testing::ExpandIn;
 
 TEST(OutputMapTest, EachOutputByteMapsToItsSourceByte) {
@@ -101,7 +100,8 @@ TEST(FramesTest, WithoutAFileScope) {
         {"@$N = \"v\"", "1:3 No filescope frame for $N"},
         {"@importpath \"inc\"", "1:13 @importpath directive not supported"},
     };
-    for (const auto& [text, error] : errors) EXPECT_EQ(ErrorIn(text, [&] { ExpandIn(root, text, &handler); }), error);
+    for (const auto& [text, error] : errors)
+        EXPECT_EQ(testing::ErrorIn(text, [&] { ExpandIn(root, text, &handler); }), error);
     // "@def +" fails inside @assertfails just as outside it; there are no dollar macros.
     EXPECT_EQ(ExpandIn(root, "@assertfails{@def +x = 1}ok \"$(OTHER)\""), "ok \"$(OTHER)\"");
 }
