@@ -1,92 +1,56 @@
 #include "support/test_support.h"
 
+#include <fcntl.h>
 #include <gtest/gtest.h>
 #include <pthread.h>
+#include <spawn.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
-#include <csignal>
 #include <algorithm>
-#include <cstdio>
 #include <fstream>
 #include <random>
 #include <sstream>
-#include <thread>
 
 #include "ovmacro/expander/macro_expander.h"
 
+extern char** environ;
+
 namespace orvan::testing {
 
-namespace {
-
-std::string ReadFd(int fd) {
-    std::string s;
-    char buf[65536];
-    for (;;) {
-        const ssize_t n = ::read(fd, buf, sizeof buf);
-        if (n < 0 && errno == EINTR) continue;
-        if (n <= 0) break;
-        s.append(buf, static_cast<size_t>(n));
-    }
-    return s;
-}
-
-}  // namespace
-
 ToolResult RunTool(const std::vector<std::string>& args, const std::string& input, const std::string& workingDir) {
-    // A tool that does not read all of its standard input must not end the test with SIGPIPE.
-    ::signal(SIGPIPE, SIG_IGN);
-    int inPipe[2], outPipe[2], errPipe[2];
-    if (::pipe(inPipe) || ::pipe(outPipe) || ::pipe(errPipe)) return {};
-    const pid_t pid = ::fork();
-    if (pid == 0) {
-        ::signal(SIGPIPE, SIG_DFL);
-        ::dup2(inPipe[0], 0);
-        ::dup2(outPipe[1], 1);
-        ::dup2(errPipe[1], 2);
-        for (int fd : {inPipe[0], inPipe[1], outPipe[0], outPipe[1], errPipe[0], errPipe[1]}) ::close(fd);
-        if (!workingDir.empty() && ::chdir(workingDir.c_str()) != 0) ::_exit(127);
-        std::vector<char*> argv;
-        std::string tool = OVMACRO_TOOL_PATH;
-        argv.push_back(tool.data());
-        std::vector<std::string> copy = args;
-        for (auto& a : copy) argv.push_back(a.data());
-        argv.push_back(nullptr);
-        ::execv(tool.c_str(), argv.data());
-        ::_exit(127);
-    }
-    ::close(inPipe[0]);
-    ::close(outPipe[1]);
-    ::close(errPipe[1]);
-    // Feed standard input from a thread so that a large input cannot deadlock against full output pipes.
-    std::thread feeder([&] {
-        size_t done = 0;
-        while (done < input.size()) {
-            const ssize_t n = ::write(inPipe[1], input.data() + done, input.size() - done);
-            if (n <= 0) break;
-            done += static_cast<size_t>(n);
-        }
-        ::close(inPipe[1]);
-    });
+    // Standard input and the two outputs are files, so that no pipe can fill up and block either side.
+    const TempDir io;
+    const std::string in = io.Write("in", input), out = (io.path() / "out").string(),
+                      err = (io.path() / "err").string();
+    posix_spawn_file_actions_t actions;
+    posix_spawn_file_actions_init(&actions);
+    posix_spawn_file_actions_addopen(&actions, 0, in.c_str(), O_RDONLY, 0);
+    posix_spawn_file_actions_addopen(&actions, 1, out.c_str(), O_WRONLY | O_CREAT, 0600);
+    posix_spawn_file_actions_addopen(&actions, 2, err.c_str(), O_WRONLY | O_CREAT, 0600);
+    if (!workingDir.empty()) posix_spawn_file_actions_addchdir_np(&actions, workingDir.c_str());
+    std::string tool = OVMACRO_TOOL_PATH;
+    std::vector<std::string> copy = args;
+    std::vector<char*> argv{tool.data()};
+    for (std::string& a : copy) argv.push_back(a.data());
+    argv.push_back(nullptr);
+    pid_t pid = 0;
     ToolResult r;
-    std::thread errReader([&] { r.err = ReadFd(errPipe[0]); });
-    r.out = ReadFd(outPipe[0]);
-    errReader.join();
-    feeder.join();
-    ::close(outPipe[0]);
-    ::close(errPipe[0]);
-    int status = 0;
-    ::waitpid(pid, &status, 0);
-    r.exitCode = WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status);
+    if (posix_spawn(&pid, tool.c_str(), &actions, nullptr, argv.data(), environ) == 0) {
+        int status = 0;
+        ::waitpid(pid, &status, 0);
+        r.exitCode = WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status);
+        r.out = ReadFile(out);
+        r.err = ReadFile(err);
+    }
+    posix_spawn_file_actions_destroy(&actions);
     return r;
 }
 
 TempDir::TempDir() {
-    std::random_device rd;
-    for (;;) {
-        path_ = std::filesystem::temp_directory_path() / ("ovmacro-test-" + std::to_string(rd()));
-        if (std::filesystem::create_directory(path_)) break;
-    }
+    std::random_device random;
+    do path_ = std::filesystem::temp_directory_path() / ("ovmacro-test-" + std::to_string(random()));
+    while (!std::filesystem::create_directory(path_));
 }
 
 TempDir::~TempDir() {
@@ -124,24 +88,22 @@ std::string MessageOf(const std::function<void()>& fn) {
     return MessageOf(fn, ignored);
 }
 
-int64 OffsetIn(const std::string& text, const char* p) {
-    const auto begin = reinterpret_cast<std::uintptr_t>(text.data());
-    const auto pos = reinterpret_cast<std::uintptr_t>(p);
-    if (!p || pos < begin || pos > begin + text.size()) return -1;
-    return static_cast<int64>(pos - begin);
+int64 OffsetIn(std::string_view text, const char* p) {
+    const std::less_equal<const char*> le;
+    if (!p || !le(text.data(), p) || !le(p, text.data() + text.size())) return -1;
+    return p - text.data();
 }
 
-std::string LineColumn(const std::string& text, const char* p) {
+std::string LineColumn(std::string_view text, const char* p) {
     const int64 offset = OffsetIn(text, p);
     if (offset < 0) return "-";
-    const size_t lineStart = text.rfind('\n', offset == 0 ? 0 : static_cast<size_t>(offset) - 1);
-    const size_t column = lineStart == std::string::npos || offset == 0 ? static_cast<size_t>(offset) + 1
-                                                                          : static_cast<size_t>(offset) - lineStart;
-    const auto line = std::count(text.begin(), text.begin() + offset, '\n') + 1;
-    return std::to_string(line) + ":" + std::to_string(column);
+    const std::string_view before = text.substr(0, static_cast<size_t>(offset));
+    const size_t lineStart = before.rfind('\n') + 1;  // 0 on the first line
+    return std::to_string(std::count(before.begin(), before.end(), '\n') + 1) + ":" +
+           std::to_string(before.size() - lineStart + 1);
 }
 
-std::string ErrorIn(const std::string& text, const std::function<void()>& fn) {
+std::string ErrorIn(std::string_view text, const std::function<void()>& fn) {
     const char* position = nullptr;
     const std::string message = MessageOf(fn, position);
     return LineColumn(text, position) + " " + message;
@@ -156,22 +118,6 @@ std::string ExpandIn(VarFrame& frame, const std::string& text, ImportHandler* ha
 std::string ExpandText(const std::string& text, ImportHandler* handler) {
     FileScopeVarFrame frame;
     return ExpandIn(frame, text, handler);
-}
-
-std::string ExpansionError(const std::string& text) {
-    return ErrorIn(text, [&] { ExpandText(text); });
-}
-
-int64 OffsetOf(const std::string& text, const char* marker, bool last) {
-    if (std::string(marker) == kAtEnd) return static_cast<int64>(text.size());
-    const size_t at = last ? text.rfind(marker) : text.find(marker);
-    return static_cast<int64>(at);
-}
-
-void ExpectErrorAt(const std::string& text, const std::string& message, const char* at, bool last) {
-    const char* position = nullptr;
-    EXPECT_EQ(MessageOf([&] { ExpandText(text); }, position), message);
-    EXPECT_EQ(OffsetIn(text, position), OffsetOf(text, at, last));
 }
 
 void RunOnStackOf(size_t bytes, const std::function<void()>& fn) {

@@ -1,4 +1,5 @@
-// Helpers shared by the test programs: running the ovmacro tool, temporary directories, exception capture.
+// Helpers shared by the test programs: running the ovmacro tool, temporary folders, expanding a text, and
+// stating where an error was raised.
 #pragma once
 
 #include <cstring>
@@ -17,16 +18,16 @@
 namespace orvan::testing {
 
 struct ToolResult {
-    int exitCode = -1;
-    std::string out;  // standard output
-    std::string err;  // standard error
+    int exitCode = -1;  // 128 + N when signal N ended it
+    std::string out;    // standard output
+    std::string err;    // standard error
 };
 
-// Runs the ovmacro tool built with the tests, with the given arguments and standard input.
+// Runs the ovmacro tool built with the tests, with the given arguments and standard input, in workingDir.
 ToolResult RunTool(const std::vector<std::string>& args, const std::string& input = "",
                    const std::string& workingDir = "");
 
-// A fresh directory under the system's temporary directory, removed with everything in it when destroyed.
+// A fresh folder under the system's temporary folder, removed with everything in it when destroyed.
 class TempDir {
 public:
     TempDir();
@@ -34,7 +35,7 @@ public:
     TempDir(const TempDir&) = delete;
     TempDir& operator=(const TempDir&) = delete;
     const std::filesystem::path& path() const { return path_; }
-    // Writes a file (relative to the directory) and returns its full path.
+    // Writes a file (relative to the folder, its folders made) and returns its full path.
     std::string Write(const std::string& relativePath, const std::string& content) const;
 
 private:
@@ -43,31 +44,24 @@ private:
 
 std::string ReadFile(const std::string& path);
 
-// Runs fn and returns the message of the LexScannerException it raises; fails the test when it raises none.
+// Runs fn and returns the message of the LexScannerException it raises (and its position); fails the test
+// when it raises none.
 std::string MessageOf(const std::function<void()>& fn);
-// The same, also giving the exception's position.
 std::string MessageOf(const std::function<void()>& fn, const char*& position);
 
 // The offset of p in text, or -1 when p does not point into it (or just past its end).
-int64 OffsetIn(const std::string& text, const char* p);
-// "LINE:COLUMN" of p in text, both from 1 (a column counts bytes), as the golden cases write places; "-" when
-// p lies outside the text.
-std::string LineColumn(const std::string& text, const char* p);
-// Runs fn and returns "LINE:COLUMN MESSAGE" of the LexScannerException it raises, its place taken in text;
-// fails the test when it raises none.
-std::string ErrorIn(const std::string& text, const std::function<void()>& fn);
-// Expands text (which must outlive the frame's definitions) in frame, into a string, with the given import
+int64 OffsetIn(std::string_view text, const char* p);
+// "LINE:COLUMN" of p in text, both from 1 (a column counts bytes), as the golden cases write places; "-"
+// when p lies outside the text.
+std::string LineColumn(std::string_view text, const char* p);
+// Runs fn and returns "LINE:COLUMN MESSAGE" of the LexScannerException it raises, its place taken in text.
+std::string ErrorIn(std::string_view text, const std::function<void()>& fn);
+
+// Expands text (which must outlive the frame's definitions) in frame into a string, with the given import
 // handler (none by default).
 std::string ExpandIn(VarFrame& frame, const std::string& text, ImportHandler* handler = nullptr);
 // Expands text in a fresh file-scope frame.
 std::string ExpandText(const std::string& text, ImportHandler* handler = nullptr);
-// ErrorIn of expanding text in a fresh file-scope frame.
-std::string ExpansionError(const std::string& text);
-
-// Transitional: removed once no test states positions by markers.
-inline constexpr const char* kAtEnd = "\x01<end>";
-int64 OffsetOf(const std::string& text, const char* marker, bool last = false);
-void ExpectErrorAt(const std::string& text, const std::string& message, const char* at, bool last = false);
 
 // Runs fn on a new thread with a stack of `bytes` (1 MiB is the smallest that hosts commonly give).
 void RunOnStackOf(size_t bytes, const std::function<void()>& fn);
@@ -92,6 +86,7 @@ public:
         if (!text.empty()) std::memcpy(data_.get(), text.data(), text.size());
     }
     BasicSubString view() const { return BasicSubString(data_.get(), data_.get() + size_); }
+    std::string_view text() const { return {data_.get(), size_}; }
     int64 size() const { return static_cast<int64>(size_); }
     // The offset of p in the buffer (its end included); -1 for null, -2 for an address outside it.
     int64 Offset(const char* p) const {
