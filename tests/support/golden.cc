@@ -153,8 +153,12 @@ std::vector<std::string> Expectations(const GoldenCase& c) {
     // A case keeps the form of its expectation: the exact standard error ('?') or the reports ('!').
     if (r.exitCode == 1 && !c.rawErr) reports = ErrorTexts(WithoutEchoes(RunCase(c, true).result.err));
     for (const std::string& report : reports) {
-        std::istringstream in(Normalised(report));
-        for (std::string line, mark = "! "; std::getline(in, line); mark = "| ") lines.push_back(mark + Escape(line));
+        const std::string text = Normalised(report);
+        for (size_t from = 0, lf = 0; lf != std::string::npos; from = lf + 1) {
+            lf = text.find('\n', from);
+            const std::string line = Escape(text.substr(from, lf == std::string::npos ? lf : lf - from));
+            lines.push_back((from == 0 ? "!" : "|") + (line.empty() ? "" : " " + line));
+        }
     }
     if (reports.empty() && (r.exitCode != 0 || !r.err.empty())) {
         const bool lineFeed = !r.err.empty() && r.err.back() == '\n';
