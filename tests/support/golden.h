@@ -13,7 +13,8 @@
 //                                   "-" for a report without a place; one '!' line per report
 //     ? 2 ovmacro: unknown option   instead: the exact standard error (a line feed added) and exit status
 //     = out.d: t.ovm: t.ovm         a file the run must leave, with its exact content ("<missing>": none)
-//     | more                        continues the line before it on a new line
+//     | more                        continues the line before it on a new line; in a report, a line "..."
+//                                   stands for any number of lines (the middle of a Python traceback)
 //
 // In a text, \n \t \r \\ and \xHH stand for their characters; any other backslash stays as written. Errors
 // are checked in the gnu form (FILE:LINE:COLUMN: error: MESSAGE, then the echoed source line and its caret,
@@ -21,8 +22,8 @@
 // nested too deeply", and the chain of calls below it, depend on the build's stack and are compared as
 // placeholders.
 //
-// OVMACRO_GOLDEN_REFRESH=1 build/.../ovmacro_<folder>_tests rewrites the expectations of every case from what
-// the tool does now: read the diff before committing it.
+// OVMACRO_GOLDEN_REFRESH=1 build/.../ovmacro_<folder>_tests rewrites the expectations of every case that does
+// not run as written from what the tool does now: read the diff before committing it.
 #pragma once
 
 #include <gtest/gtest.h>
