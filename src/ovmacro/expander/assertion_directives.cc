@@ -1,5 +1,5 @@
 // Directives with which a text checks itself while it is expanded: @assert, @assertfails and @fail.
-#include "ovmacro/expander/condition.h"
+#include "ovmacro/expander/directive_text.h"
 #include "ovmacro/expander/macro_expander.h"
 #include "ovmacro/expr/expression_parser.h"
 #include "ovmacro/foundations/compose.h"
@@ -45,16 +45,7 @@ void MacroExpander::ProcessAssertDirective() {
         MacroExpand(nullptr, &child, condition, 0, 0, expanded);
     }
     bool holds = false;
-    try {
-        holds = ParseExpandedCondition(expanded);
-    } catch (LexScannerException& e) {
-        // The expanded text has no place in the source: the error moves to the directive's '@', and its end
-        // reads as the closing bracket that the user wrote.
-        StringFindAndReplace(e.GetMessage(), "EOS", ")");
-        e.AppendToMessage(Compose("\n    in @assert(", expanded, ")"));
-        e.SetPosition(currentToken.begin());
-        throw;
-    }
+    ParseDirectiveText(expanded, "@assert", currentToken.begin(), [&](ExpressionParser& p) { holds = p.ParseBool(false); });
     if (!holds)
         throw LexScannerException(
             Compose("Assertion failure\n        @assert(", condition, ")\nie      @assert(", expanded, ")"),

@@ -6,6 +6,7 @@
 
 #include "ovmacro/expander/call_context.h"
 #include "ovmacro/expander/held_text.h"
+#include "ovmacro/expander/directive_text.h"
 #include "ovmacro/expander/macro_expander.h"
 #include "ovmacro/expander/nesting_guard.h"
 #include "ovmacro/expander/plain_text.h"
@@ -213,22 +214,10 @@ basic_xstring MacroExpander::EvaluateString(BasicSubString sectionText, BasicSub
         e.AppendCallContextLine(Compose("\n    in ", directiveName, "(", sectionText, ")"));
         throw;
     }
-    try {
-        ExpressionParser parser;
-        parser.GetToken() = LSToken(TK_LPAREN, BasicSubString("("));
-        parser.Init(BasicSubString(expanded));
-        basic_xstring result = parser.ParseString(false);
-        if (parser.GetTokenType() != TK_EOS)
-            throw LexScannerException(Compose("Expected ) after ", parser.lastToken, " when read ", parser.GetToken(),
-                                              " in expression"),
-                                      parser.GetToken());
-        return result;
-    } catch (LexScannerException& e) {
-        StringFindAndReplace(e.GetMessage(), "EOS", ")");
-        e.AppendToMessage(Compose("\n    in ", directiveName, "(", expanded, ")"));
-        e.SetPosition(currentToken.begin());
-        throw;
-    }
+    basic_xstring result;
+    ParseDirectiveText(expanded, directiveName, currentToken.begin(),
+                       [&](ExpressionParser& p) { result = p.ParseString(false); });
+    return result;
 }
 
 }  // namespace orvan

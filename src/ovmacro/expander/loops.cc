@@ -1,5 +1,5 @@
 // @for over a list or a list of tuples, and @while: expand a block once per item or while a condition holds.
-#include "ovmacro/expander/condition.h"
+#include "ovmacro/expander/directive_text.h"
 #include "ovmacro/expander/held_text.h"
 #include "ovmacro/expander/macro_expander.h"
 #include "ovmacro/foundations/compose.h"
@@ -131,7 +131,7 @@ void MacroExpander::ProcessWhileDirective() {
     }
     AdvanceWritePos(cursor.begin(), false);
     const int64 blockOutputIndent = GetOutputPos();
-    while (EvaluateConditionText(frame, condition, "@while", currentToken)) {
+    while (EvaluateConditionText(frame, condition, "@while", currentToken.begin())) {
         if (block.empty()) continue;
         VarFrame iterationFrame(frame);
         MacroExpand(nullptr, &iterationFrame, block, indent, blockOutputIndent, *output);

@@ -8,6 +8,7 @@
 #endif
 
 #include "ovmacro/foundations/scanning.h"
+#include "ovmacro/lexer/char_classes.h"
 #include "ovmacro/lexer/token_scanner.h"
 #include "ovmacro/vars/name_filter.h"
 
@@ -15,7 +16,8 @@ namespace orvan {
 
 namespace {
 
-enum CharClass : unsigned char {
+// The fast lane's view of the token scanner's character classes (the one table both read).
+enum LaneClass : unsigned char {
     kStop,         // '@', a byte that begins no token, or anything not handled here
     kBlank,        // white space other than a line feed
     kLineFeed,
@@ -28,26 +30,32 @@ enum CharClass : unsigned char {
     kIdentifier,
 };
 
-constexpr std::array<CharClass, 256> MakeClasses() {
-    std::array<CharClass, 256> t{};
+constexpr std::array<LaneClass, 256> MakeLaneClasses() {
+    std::array<LaneClass, 256> t{};
     for (int c = 0; c < 256; ++c) {
-        if (c >= 0x80 || (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || c == '_') t[c] = kIdentifier;
+        switch (kCharClasses[c]) {
+            // Only blanks and tabs: a carriage return, vertical tab or form feed goes to the main loop, where it
+            // ends the blanks before a line feed, so that the token scanner, not the line handling, skips the
+            // line end that follows it and the next line keeps its indentation.
+            case CharClass::kWhiteSpace: t[c] = c == ' ' || c == '\t' ? kBlank : kStop; break;
+            case CharClass::kLineFeed: t[c] = kLineFeed; break;
+            case CharClass::kIdentifier: t[c] = kIdentifier; break;
+            case CharClass::kDigit: t[c] = kDigit; break;
+            case CharClass::kSingleQuote: t[c] = kSingleQuote; break;
+            case CharClass::kDoubleQuote: t[c] = kDoubleQuote; break;
+            case CharClass::kSlash: t[c] = kSlash; break;
+            case CharClass::kPlus: t[c] = kPlus; break;
+            // Every other operator, alone or extended, is a token that cannot fail: skipped a byte at a time.
+            case CharClass::kOperator:
+            case CharClass::kSingle: t[c] = kPunctuation; break;
+            case CharClass::kAt:
+            case CharClass::kOther: t[c] = kStop; break;
+        }
     }
-    // Only blanks and tabs: a carriage return, vertical tab or form feed goes to the main loop, where it ends
-    // the blanks before a line feed, so that the token scanner, not the line handling, skips the line end
-    // that follows it and the next line keeps its indentation.
-    for (char c : {' ', '\t'}) t[static_cast<unsigned char>(c)] = kBlank;
-    t['\n'] = kLineFeed;
-    for (char c : std::string_view("<>&|^*%!=?-:$#.,;(){}[]~\\`")) t[static_cast<unsigned char>(c)] = kPunctuation;
-    t['+'] = kPlus;
-    t['/'] = kSlash;
-    for (int c = '0'; c <= '9'; ++c) t[c] = kDigit;
-    t['\''] = kSingleQuote;
-    t['"'] = kDoubleQuote;
     return t;
 }
 
-constexpr std::array<CharClass, 256> kClasses = MakeClasses();
+constexpr std::array<LaneClass, 256> kClasses = MakeLaneClasses();
 
 constexpr std::array<bool, 256> MakeIdentifierBytes() {
     std::array<bool, 256> t{};
@@ -124,11 +132,10 @@ const char* EndOfQuietBytes(const char* p, const char* end, bool lineFeedsNeedWo
             if (p == end) break;
         }
         const unsigned char c = static_cast<unsigned char>(*p);
-        const CharClass k = kClasses[c];
+        const LaneClass k = kClasses[c];
         // Words and the blanks between them are most of any text: they take the shortest way.
         if (k == kIdentifier) {
-            // r or R directly before a quote begins a raw literal, not an identifier.
-            if ((c == 'r' || c == 'R') && end - p >= 2 && (p[1] == '"' || p[1] == '\'')) {
+            if (BeginsRawLiteral(p, end)) {
                 if (p[1] == '"' && dollarMacrosActive) return {p, ordinaryEnd, nullptr};
                 BasicSubString s(p, end);
                 LsScanLiteralString(s, p[1], p[1] == '"' ? "double quoted string" : "single quoted string");
@@ -152,43 +159,18 @@ const char* EndOfQuietBytes(const char* p, const char* end, bool lineFeedsNeedWo
                 ordinaryEnd = ++p;
                 continue;
             case kPunctuation: ordinaryEnd = ++p; continue;
+            case kDigit:
+                if (const char* q = EndOfPlainInteger(p, end)) {
+                    ordinaryEnd = p = q;
+                    continue;
+                }
+                [[fallthrough]];
             case kPlus:
-                if (end - p >= 2 && p[1] == '+') {
-                    if (end - p >= 3 && p[2] == '=') return {p, ordinaryEnd, nullptr};  // the scanner reports it
-                    p += 2;
-                } else {
-                    ++p;
-                }
-                ordinaryEnd = p;
-                continue;
             case kSlash: {
-                if (end - p >= 2 && p[1] == '/') {
-                    const void* lf = std::memchr(p, '\n', static_cast<size_t>(end - p));
-                    p = lf ? static_cast<const char*>(lf) : end;
-                } else if (end - p >= 2 && p[1] == '*') {
-                    const std::string_view rest(p + 2, static_cast<size_t>(end - p - 2));
-                    const size_t close = rest.find("*/");
-                    if (close == std::string_view::npos) return {p, ordinaryEnd, nullptr};  // the scanner reports it
-                    p += 2 + close + 2;
-                } else {
-                    ++p;
-                }
-                ordinaryEnd = p;
-                continue;
-            }
-            case kDigit: {
-                // A run of digits followed by anything that cannot continue a number is a whole number token;
-                // anything else (a hex prefix, a fraction, an exponent) goes through the number scanner.
-                const char* q = p + 1;
-                while (q < end && kClasses[static_cast<unsigned char>(*q)] == kDigit) ++q;
-                const bool maybeLonger =
-                    q < end && (*q == '.' || *q == 'e' || *q == 'E' || (q == p + 1 && (*q == 'x' || *q == 'X')));
-                if (maybeLonger) {
-                    BasicSubString s(p, end);
-                    LsScanNumber(s);
-                    q = s.begin();
-                }
-                ordinaryEnd = p = q;
+                // Operators that may fail, comments and numbers are read by the token scanner itself.
+                BasicSubString s(p, end);
+                LsScanTokenHelper(s);
+                ordinaryEnd = p = s.begin();
                 continue;
             }
             case kSingleQuote: {

@@ -4,6 +4,7 @@
 #include <memory>
 
 #include "ovmacro/expander/held_text.h"
+#include "ovmacro/expander/directive_text.h"
 #include "ovmacro/expander/macro_expander.h"
 #include "ovmacro/expr/expression_parser.h"
 #include "ovmacro/foundations/compose.h"
@@ -88,11 +89,10 @@ void MacroExpander::ProcessUnstrDirective() {
     const basic_xstring expanded = ExpandInChildFrame(frame, section, 0);
     StringStream decoded;
     try {
-        UnstringifyQuotedString(BasicSubString(expanded), decoded);
+        UnstringifyQuotedString(BasicSubString(expanded), decoded, ")");
     } catch (LexScannerException& e) {
         // The decoded text is a temporary: the error is reported at the directive, where the user sees the
         // closing bracket rather than an end of text.
-        StringFindAndReplace(e.GetMessage(), "EOS", ")");
         e.AppendToMessage(Compose("\n    in @unstr(", expanded, ")"));
         e.SetPosition(currentToken.begin());
         throw;
@@ -125,22 +125,8 @@ void MacroExpander::ProcessRndBracketDirective() {
     AdvanceWritePos(cursor.begin(), false);
     const basic_xstring expanded = ExpandInChildFrame(frame, section, 0);
     basic_xstring value;
-    try {
-        ExpressionParser parser;
-        parser.GetToken() = LSToken(TK_LPAREN, BasicSubString("("));
-        parser.Init(BasicSubString(expanded));
-        // Any type is accepted and written as its text.
-        value = parser.ParseString(true);
-        if (parser.GetTokenType() != TK_EOS)
-            throw LexScannerException(Compose("Expected ) after ", parser.lastToken, " when read ",
-                                              parser.GetToken(), " in expression"),
-                                      parser.GetToken());
-    } catch (LexScannerException& e) {
-        StringFindAndReplace(e.GetMessage(), "EOS", ")");
-        e.AppendToMessage(Compose("\n    in @(", expanded, ")"));
-        e.SetPosition(currentToken.begin());
-        throw;
-    }
+    // Any type is accepted and written as its text.
+    ParseDirectiveText(expanded, "@", currentToken.begin(), [&](ExpressionParser& p) { value = p.ParseString(true); });
     WriteCalculatedSubString(BasicSubString(value));
 }
 

@@ -343,7 +343,7 @@ namespace {
 // LexScannerExceptions at the token current when they are caught.
 [[noreturn, gnu::noinline]] void ThrowExpectedValue(const ExpressionParser& parser, const char* typeName) {
     StringStream ss(4096);
-    ss << "Expected " << typeName << " when read " << parser.token;
+    ss << "Expected " << typeName << " when read " << parser.Named(parser.token);
     throw LexScannerException(ss.GetString(), parser.token);
 }
 

@@ -46,7 +46,7 @@ basic_xstring ParserBase::ParsePath() {
 
 void ParserBase::ThrowExpectedException(const char* what) const {
     StringStream ss(4096);
-    ss << "Expected " << what << " after " << lastToken << " when read " << token;
+    ss << "Expected " << what << " after " << Named(lastToken) << " when read " << Named(token);
     throw LexScannerException(ss.GetString(), token);
 }
 

@@ -6,7 +6,7 @@
 //     p.ParseGivenToken(TK_ASSIGN, "=");     // or "Expected = after <name> when read <token>"
 //
 // A caller may set `token` before Init: Init moves it into `lastToken`, so that a message about the first
-// token names it as the one before (the directives preset "(" this way).
+// token names it as the one before (the directives preset "(" this way), and `endName` for the end.
 #pragma once
 
 #include "ovmacro/foundations/sub_string.h"
@@ -36,10 +36,15 @@ class ParserBase {
     basic_xstring ParsePath();
     // "Expected <what> after <lastToken> when read <token>", positioned at `token`.
     [[noreturn]] void ThrowExpectedException(const char* what) const;
+    // A token as this parser's messages name it (see endName).
+    NamedToken Named(const LSToken& t) const { return {t, endName}; }
 
     LSToken token;          // the current token, the one the next rule looks at
     LSToken lastToken;      // the token read before `token`
     BasicSubString cursor;  // the text not yet scanned
+    // How messages name the end of the text: "EOS", or the closing bracket of a directive whose expanded text
+    // is parsed (see also the preset token above).
+    const char* endName = "EOS";
 };
 
 }  // namespace orvan

@@ -77,7 +77,7 @@ Builtin FindBuiltin(std::string_view name) {
 
 [[noreturn, gnu::noinline]] void ThrowUnexpectedToken(const ExpressionParser& parser) {
     StringStream ss(4096);
-    ss << "Unexpected " << parser.token << " after " << parser.lastToken << " in expression";
+    ss << "Unexpected " << parser.Named(parser.token) << " after " << parser.Named(parser.lastToken) << " in expression";
     throw LexScannerException(ss.GetString(), parser.token);
 }
 

@@ -9,13 +9,13 @@
 
 namespace orvan {
 
-inline bool IsIdentifierStart(char c) {
+constexpr bool IsIdentifierStart(char c) {
     const unsigned char u = static_cast<unsigned char>(c);
     return (u >= 'a' && u <= 'z') || (u >= 'A' && u <= 'Z') || u == '_' || u >= 0x80;
 }
-inline bool IsIdentifierChar(char c) { return IsIdentifierStart(c) || (c >= '0' && c <= '9'); }
+constexpr bool IsIdentifierChar(char c) { return IsIdentifierStart(c) || (c >= '0' && c <= '9'); }
 // Blank, tab, line feed, carriage return, vertical tab, form feed.
-inline bool IsWhiteSpace(char c) { return c == ' ' || c == '\t' || c == '\n' || c == '\r' || c == '\v' || c == '\f'; }
+constexpr bool IsWhiteSpace(char c) { return c == ' ' || c == '\t' || c == '\n' || c == '\r' || c == '\v' || c == '\f'; }
 
 // A letter, '_' or a byte >= 0x80 first, then letters, digits, '_' and bytes >= 0x80, so that UTF-8 text
 // reads as identifiers.

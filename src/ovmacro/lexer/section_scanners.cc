@@ -4,6 +4,7 @@
 
 #include <algorithm>
 
+#include "ovmacro/foundations/compose.h"
 #include "ovmacro/foundations/scanning.h"
 #include "ovmacro/lexer/exceptions.h"
 #include "ovmacro/lexer/token_scanner.h"
@@ -18,8 +19,8 @@ using HR = HumanReadableCharInSubString;
     throw LexScannerException(ss.GetString(), position);
 }
 
-[[noreturn]] void Fail(const char* message, const char* position) {
-    throw LexScannerException(basic_xstring(message), position);
+[[noreturn]] void Fail(const basic_xstring& message, const char* position) {
+    throw LexScannerException(message, position);
 }
 
 // The closing partner of an opening bracket kind, or TK_NONE for any other kind.
@@ -140,7 +141,7 @@ bool ScanAtWord(BasicSubString& s, const char* word) {
 
 // Decodes the quoted string at the start of s, writing to os when it is not null. Runs of plain characters
 // go out in one write.
-void DecodeQuotedString(BasicSubString s, xostream* os) {
+void DecodeQuotedString(BasicSubString s, xostream* os, const char* endName) {
     if (s.empty()) Fail("Expected quoted string", s.begin());
     const char quote = s.front();
     if (quote != '"' && quote != '\'') {
@@ -152,7 +153,7 @@ void DecodeQuotedString(BasicSubString s, xostream* os) {
     if (s.empty()) Fail("Expected quoted string", s.begin());
     const char* run = s.begin();
     for (;;) {
-        if (s.empty()) Fail("Met EOS in middle of string", s.end());
+        if (s.empty()) Fail(Compose("Met ", endName, " in middle of string"), s.end());
         const char c = s.front();
         if (c == quote) break;
         if (c == '\n') Fail("Met end of line in middle of string", s.begin());
@@ -162,13 +163,13 @@ void DecodeQuotedString(BasicSubString s, xostream* os) {
         }
         if (os) os->put(run, s.begin() - run);
         s.Advance(1);
-        if (s.empty()) Fail("Met EOS in middle of string", s.end());
+        if (s.empty()) Fail(Compose("Met ", endName, " in middle of string"), s.end());
         char decoded = 0;
         if (s.front() == 'x') {
             s.Advance(1);
             int value = 0;
             for (int i = 0; i < 2; ++i) {
-                if (s.empty()) Fail("Expected hex character when reached EOS", s.end());
+                if (s.empty()) Fail(Compose("Expected hex character when reached ", endName), s.end());
                 if (!IsHexDigit(s.front())) {
                     StringStream ss;
                     ss << "Expected hex character when read " << HR(s);
@@ -333,9 +334,9 @@ bool SubStringsAreTokenEquivalent(BasicSubString a, BasicSubString b) {
     }
 }
 
-void UnstringifyQuotedString(BasicSubString s, xostream& os) {
-    DecodeQuotedString(s, nullptr);
-    DecodeQuotedString(s, &os);
+void UnstringifyQuotedString(BasicSubString s, xostream& os, const char* endName) {
+    DecodeQuotedString(s, nullptr, endName);
+    DecodeQuotedString(s, &os, endName);
 }
 
 int64 ScanBackwardsThroughSpacesAndTabs(BasicSubString& s) {

@@ -52,7 +52,8 @@ bool SubStringsAreTokenEquivalent(BasicSubString a, BasicSubString b);
 
 // Writes the characters that the quoted string at the start of `s` stands for; text after its closing quote
 // is ignored. The whole string is checked before anything is written, so nothing reaches `os` on an error.
-void UnstringifyQuotedString(BasicSubString s, xostream& os);
+// Messages name the end of `s` `endName`.
+void UnstringifyQuotedString(BasicSubString s, xostream& os, const char* endName = "EOS");
 
 // Removes the spaces and tabs at the end of `s` and returns their width in columns (space 1, tab 4).
 int64 ScanBackwardsThroughSpacesAndTabs(BasicSubString& s);

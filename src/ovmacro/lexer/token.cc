@@ -105,9 +105,11 @@ void LSToken::GetLiteralString(basic_xstring& out) const {
     }
 }
 
-xostream& operator<<(xostream& os, const LSToken& t) {
-    if (t.text.empty()) return os << "EOS";
-    return os << t.text;
+xostream& operator<<(xostream& os, const LSToken& t) { return os << NamedToken{t, "EOS"}; }
+
+xostream& operator<<(xostream& os, const NamedToken& t) {
+    if (t.token.text.empty()) return os << t.endName;
+    return os << t.token.text;
 }
 
 bool IsAssignmentToken(EToken t) {

@@ -115,6 +115,13 @@ public:
 
 // Writes "EOS" for an empty text, else the text.
 xostream& operator<<(xostream& os, const LSToken& t);
+// A token as a message names it: its text, or `endName` at the end of the text (a directive that parses the
+// expansion of its bracketed text names the end by the closing bracket the user wrote).
+struct NamedToken {
+    const LSToken& token;
+    const char* endName;
+};
+xostream& operator<<(xostream& os, const NamedToken& t);
 
 // Decimal digits, wrapping in the arithmetic of T (no sign, no overflow check).
 template <class T>

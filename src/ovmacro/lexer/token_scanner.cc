@@ -1,6 +1,7 @@
 #include "ovmacro/lexer/token_scanner.h"
 
 #include "ovmacro/foundations/scanning.h"
+#include "ovmacro/lexer/char_classes.h"
 
 namespace orvan {
 
@@ -72,20 +73,41 @@ LSToken LsScanToken(BasicSubString& s, bool returnComments) {
 
 EToken LsScanTokenHelper(BasicSubString& s) {
     const char c = s.front();
-    if (IsDigit(c)) return LsScanNumber(s);
-    // Only a quote, or r or R, can begin a literal: other characters skip both attempts.
-    if (c == '\'' || c == '"' || c == 'r' || c == 'R') {
-        if (LsScanLiteralString(s, '\'', "single quoted string")) return TK_SQ_STRING;
-        if (LsScanLiteralString(s, '"', "double quoted string")) return TK_DQ_STRING;
-    }
-    if (ScanIdentifier(s)) return TK_IDENTIFIER;
-    if (LsScanComment(s)) return TK_COMMENT;
-    if (c == '@' && s.size() >= 2) {
-        BasicSubString afterAt(s.begin() + 1, s.end());
-        if (LsScanComment(afterAt)) {
-            s = afterAt;
-            return TK_AT_COMMENT;
+    switch (ClassOf(c)) {
+        case CharClass::kDigit: return LsScanNumber(s);
+        case CharClass::kSingleQuote:
+        case CharClass::kDoubleQuote:
+        case CharClass::kIdentifier: {
+            if (ClassOf(c) == CharClass::kIdentifier && !BeginsRawLiteral(s.begin(), s.end())) {
+                ScanIdentifier(s);
+                return TK_IDENTIFIER;
+            }
+            const char quote = ClassOf(c) == CharClass::kIdentifier ? s[1] : c;
+            LsScanLiteralString(s, quote, quote == '\'' ? "single quoted string" : "double quoted string");
+            return quote == '\'' ? TK_SQ_STRING : TK_DQ_STRING;
         }
+        case CharClass::kSlash:
+            if (LsScanComment(s)) return TK_COMMENT;
+            break;
+        case CharClass::kAt:
+            if (s.size() >= 2) {
+                BasicSubString afterAt(s.begin() + 1, s.end());
+                if (LsScanComment(afterAt)) {
+                    s = afterAt;
+                    return TK_AT_COMMENT;
+                }
+            }
+            break;
+        case CharClass::kOther:
+        case CharClass::kWhiteSpace:
+        case CharClass::kLineFeed: {
+            StringStream ss;
+            ss << "Bad token " << HR(s);
+            Fail(ss, s.begin());
+        }
+        case CharClass::kPlus:
+        case CharClass::kOperator:
+        case CharClass::kSingle: break;
     }
     const bool hasNext = s.size() >= 2;
     const char n = hasNext ? s[1] : '\0';
@@ -128,17 +150,16 @@ EToken LsScanTokenHelper(BasicSubString& s) {
         return c == ':' ? TK_COLON : TK_DOLLAR;
     }
     const EToken single = SingleCharacterKind(c);
-    if (single != TK_NONE) {
-        s.Advance(1);
-        return single;
-    }
-    StringStream ss;
-    ss << "Bad token " << HR(s);
-    Fail(ss, s.begin());
+    s.Advance(1);
+    return single;
 }
 
 EToken LsScanNumber(BasicSubString& s) {
     if (s.empty() || !IsDigit(s.front())) return TK_NONE;
+    if (const char* end = EndOfPlainInteger(s.begin(), s.end())) {
+        s.SetBegin(end);
+        return TK_INT;
+    }
     const char* start = s.begin();
     if (s.front() == '0') {
         s.Advance(1);

@@ -19,6 +19,15 @@ LSToken LsScanToken(BasicSubString& s, bool returnComments);
 EToken LsScanTokenHelper(BasicSubString& s);
 // TK_INT, TK_HEX_INT, TK_FLOAT, or TK_NONE (nothing consumed) when no digit stands here.
 EToken LsScanNumber(BasicSubString& s);
+// The end of the decimal integer token that begins at the digit at p, when nothing after its digits could make
+// it longer (a fraction, an exponent, a hex prefix); null when LsScanNumber must read it. Inline, for the
+// scanners that skip text in bulk.
+inline const char* EndOfPlainInteger(const char* p, const char* end) {
+    const char* q = p + 1;
+    while (q < end && *q >= '0' && *q <= '9') ++q;
+    const bool longer = q < end && (*q == '.' || *q == 'e' || *q == 'E' || (q == p + 1 && (*q == 'x' || *q == 'X')));
+    return longer ? nullptr : q;
+}
 bool LsScanLiteralString(BasicSubString& s, char quote, const char* description);
 bool LsScanLiteralCharacter(BasicSubString& s);
 bool LsScanEscapeCharacter(BasicSubString& s);
