@@ -24,7 +24,8 @@ inline constexpr size_t kMaxFuzzInputSize = 4096;
 inline bool ConfigureFuzzBounds() {
     orvan::SetPythonAllowed(false);
     orvan::MacroNestingGuard::SetDepthLimitForTesting(64);
-    orvan::MacroNestingGuard::SetWorkLimitsForTesting(4000, 1 << 18);
+    orvan::MacroNestingGuard::SetExpansionLimit(4000);
+    orvan::MacroNestingGuard::SetOutputLimit(1 << 18);
     orvan::FileScopeVarFrame::SetDollarMacroTextLimitForTesting(1 << 16);
     return true;
 }

@@ -73,7 +73,7 @@ TEST(WorkLimitsTest, UnboundedWorkStopsAtTheBound) {
     // One run of this loop takes exactly 33 expansions and 120 characters of output, conditions included.
     const std::string loop = "@let int n = 0\n@while(n < 10){@let n = n + 1\n}n";
     const std::string tooMany = "Expansion work limit reached (more than 200 expansions)";
-    const std::string tooLong = "Expansion work limit reached (more than 1000 characters of output)";
+    const std::string tooLong = "Expansion output limit reached (more than 1000 characters written)";
     const struct {
         int64 expansions, outputChars;
         std::string text, message;
@@ -87,17 +87,21 @@ TEST(WorkLimitsTest, UnboundedWorkStopsAtTheBound) {
         // An @assertfails that swallows the first failure cannot restart the count.
         {200, kNoWorkLimit, "@while(true){@assertfails{@while(true){}}}", tooMany},
         {32, kNoWorkLimit, loop, "Expansion work limit reached (more than 32 expansions)"},
-        {kNoWorkLimit, 119, loop, "Expansion work limit reached (more than 119 characters of output)"},
+        {kNoWorkLimit, 119, loop, "Expansion output limit reached (more than 119 characters written)"},
     };
-    const Finally restore([] { MacroNestingGuard::SetWorkLimitsForTesting(kNoWorkLimit, kNoWorkLimit); });
+    const auto setLimits = [](int64 expansions, int64 outputChars) {
+        MacroNestingGuard::SetExpansionLimit(expansions);
+        MacroNestingGuard::SetOutputLimit(outputChars);
+    };
+    const Finally restore([&] { setLimits(kNoWorkLimit, kDefaultOutputLimit); });
     for (const auto& c : cases) {
-        MacroNestingGuard::SetWorkLimitsForTesting(c.expansions, c.outputChars);
+        setLimits(c.expansions, c.outputChars);
         EXPECT_EQ(MessageOf([&] { ExpandText(c.text); }).substr(0, c.message.size()), c.message) << c.text;
     }
     // Each outermost expansion has a budget of its own.
-    MacroNestingGuard::SetWorkLimitsForTesting(33, 120);
+    setLimits(33, 120);
     for (int i = 0; i < 3; ++i) EXPECT_EQ(ExpandText(loop), "10");
-    MacroNestingGuard::SetWorkLimitsForTesting(kNoWorkLimit, kNoWorkLimit);  // the default: no bound
+    setLimits(kNoWorkLimit, kNoWorkLimit);  // no bound at all
     EXPECT_EQ(ExpandText(doubling + "a9").size(), 8u * 512 + 511);
     EXPECT_EQ(ExpandText("@let int n = 0\n@while(n < 3000){@let n = n + 1\n}n"), "3000");
 }

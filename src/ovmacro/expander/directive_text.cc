@@ -18,7 +18,7 @@ void ParseDirectiveText(const basic_xstring& expanded, BasicSubString name, cons
                                               parser.Named(parser.GetToken()), " in expression"),
                                       parser.GetToken());
     } catch (LexScannerException& e) {
-        e.AppendToMessage(Compose("\n    in ", name, "(", expanded, ")"));
+        e.AppendContextLine(Compose("\n    in ", name, "(", expanded, ")"));
         e.SetPosition(at);
         throw;
     }

@@ -197,7 +197,7 @@ void ReadVariableValueByParsingExpression(VarFrame* frame, BasicSubString text, 
             throw LexScannerException(Compose("Read ", parser.GetToken(), " in middle of expression"), parser.GetToken());
         value.swap(result);
     } catch (LexScannerException& e) {
-        e.AppendToMessage(Compose("\n    expression: ", expanded));
+        e.AppendContextLine(Compose("\n    expression: ", expanded));
         // The error points into the expanded text, which dies here: it moves back to the source character
         // that produced the faulty text.
         MovePositionOutOfExpansion(e, BasicSubString(expanded), pieces, text);

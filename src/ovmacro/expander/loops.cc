@@ -77,7 +77,7 @@ void MacroExpander::ProcessForDirective() {
         try {
             end = ScanArgument(items, item, TK_RBRACKET);
         } catch (LexScannerException& e) {
-            e.AppendToMessage(Compose("\n    in @for directive for list ", list));
+            e.AppendContextLine(Compose("\n    in @for directive for list ", list));
             e.SetPosition(listPosition);
             throw;
         }
@@ -96,7 +96,7 @@ void MacroExpander::ProcessForDirective() {
                 try {
                     valueEnd = ScanArgument(values, value, TK_RPAREN);
                 } catch (LexScannerException& e) {
-                    e.AppendToMessage(Compose("\n    in @for directive for list ", list));
+                    e.AppendContextLine(Compose("\n    in @for directive for list ", list));
                     e.SetPosition(listPosition);
                     throw;
                 }

@@ -1,16 +1,26 @@
 // The library's entry points: expand a text into an output, or into a string with or without its pieces.
+#include <new>
+
 #include "ovmacro/expander/held_text.h"
 #include "ovmacro/expander/macro_expander.h"
 #include "ovmacro/expander/nesting_guard.h"
+#include "ovmacro/lexer/bracket_index.h"
 
 namespace orvan {
 
 void MacroExpand(ImportHandler* importHandler, VarFrame* frame, BasicSubString text, int64 inputIndent,
                  int64 outputIndent, ExpandedOutput& output) {
     MacroNestingGuard guard(text.begin());
+    const BracketScope brackets(text);
     try {
         MacroExpander expander(importHandler, frame, text, inputIndent, outputIndent, output);
-        expander.Expand();
+        try {
+            expander.Expand();
+        } catch (const std::bad_alloc&) {
+            // Reported like any other error of the text, at the place reached, once the memory taken by the
+            // innermost expansion is given back; the outer levels add their context lines to it.
+            throw LexScannerException("Out of memory", expander.Position());
+        }
         output.Flush();  // the caller finds the whole expansion in its stream
     } catch (LexScannerException& e) {
         output.Flush();  // what was written before the failure stays written

@@ -55,6 +55,8 @@ public:
 
     // Runs the main loop until the text is used up.
     void Expand();
+    // Where the main loop has come to: the start of the token being handled.
+    const char* Position() const { return currentToken.begin() ? currentToken.begin() : cursor.begin(); }
 
 private:
     // Writes (or, with write false, drops) the pending text from writePos up to p; writePos becomes p.

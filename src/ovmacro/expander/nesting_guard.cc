@@ -17,11 +17,8 @@ thread_local int64 t_depth OVMACRO_INITIAL_EXEC_TLS = 0;
 thread_local int64 t_depthLimit OVMACRO_INITIAL_EXEC_TLS = 0;
 thread_local const char* t_stackLow OVMACRO_INITIAL_EXEC_TLS = nullptr;  // the lowest usable address of this thread's stack
 thread_local bool t_stackKnown OVMACRO_INITIAL_EXEC_TLS = false;
-// The work bounds (kNoWorkLimit: none) and what the thread's outermost expansion has used of them.
-thread_local int64 t_expansionLimit OVMACRO_INITIAL_EXEC_TLS = kNoWorkLimit;
-thread_local int64 t_outputLimit OVMACRO_INITIAL_EXEC_TLS = kNoWorkLimit;
+// What the thread's outermost expansion has used of the work bounds.
 thread_local int64 t_expansions OVMACRO_INITIAL_EXEC_TLS = 0;
-thread_local int64 t_outputChars OVMACRO_INITIAL_EXEC_TLS = 0;
 
 // The low end of the calling thread's stack (stacks grow down on x86-64), or null when it cannot be told.
 const char* StackLowEnd() {
@@ -59,13 +56,15 @@ MacroNestingGuard::MacroNestingGuard(const char* position) : outermost_(t_depth 
             position);
     if (outermost_) {
         t_expansions = 0;
-        t_outputChars = 0;
+        const int64 limit = s_outputLimit.load(std::memory_order_relaxed);
+        t_outputLeft = limit == kNoWorkLimit ? INT64_MAX : limit;
     }
     // Counted before the check, so that once the bound is passed every later expansion fails too, also after
     // an @assertfails has swallowed the first failure.
-    if (t_expansionLimit != kNoWorkLimit && ++t_expansions > t_expansionLimit)
+    const int64 expansionLimit = s_expansionLimit.load(std::memory_order_relaxed);
+    if (expansionLimit != kNoWorkLimit && ++t_expansions > expansionLimit)
         throw LexScannerException(
-            Compose("Expansion work limit reached (more than ", t_expansionLimit, " expansions)"), position);
+            Compose("Expansion work limit reached (more than ", expansionLimit, " expansions)"), position);
     ++t_depth;
 }
 
@@ -73,19 +72,16 @@ MacroNestingGuard::~MacroNestingGuard() { --t_depth; }
 
 void MacroNestingGuard::SetDepthLimitForTesting(int64 limit) { t_depthLimit = limit; }
 
-void MacroNestingGuard::SetWorkLimitsForTesting(int64 expansions, int64 outputChars) {
-    t_expansionLimit = expansions;
-    t_outputLimit = outputChars;
-    if (outputChars != kNoWorkLimit) s_workLimitsSet.store(true, std::memory_order_relaxed);
+void MacroNestingGuard::SetOutputLimit(int64 chars) { s_outputLimit.store(chars, std::memory_order_relaxed); }
+
+void MacroNestingGuard::SetExpansionLimit(int64 expansions) {
+    s_expansionLimit.store(expansions, std::memory_order_relaxed);
 }
 
-void MacroNestingGuard::ChargeBoundedOutput(int64 chars, const char* position) {
-    if (t_outputLimit == kNoWorkLimit) return;
-    t_outputChars += chars;
-    if (t_outputChars > t_outputLimit)
-        throw LexScannerException(
-            Compose("Expansion work limit reached (more than ", t_outputLimit, " characters of output)"),
-            position);
+void MacroNestingGuard::ThrowOutputLimit(const char* position) {
+    throw LexScannerException(Compose("Expansion output limit reached (more than ",
+                                      s_outputLimit.load(std::memory_order_relaxed), " characters written)"),
+                              position);
 }
 
 }  // namespace orvan

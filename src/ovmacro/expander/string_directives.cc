@@ -93,7 +93,7 @@ void MacroExpander::ProcessUnstrDirective() {
     } catch (LexScannerException& e) {
         // The decoded text is a temporary: the error is reported at the directive, where the user sees the
         // closing bracket rather than an end of text.
-        e.AppendToMessage(Compose("\n    in @unstr(", expanded, ")"));
+        e.AppendContextLine(Compose("\n    in @unstr(", expanded, ")"));
         e.SetPosition(currentToken.begin());
         throw;
     }
@@ -145,7 +145,7 @@ void MacroExpander::ProcessSqrBracketDirective() {
         MacroExpand(nullptr, &child, first, 0, 0, second);
     } catch (LexScannerException& e) {
         StringFindAndReplace(e.GetMessage(), "EOS", "]");
-        e.AppendToMessage(Compose("\n    in @[", first, "]"));
+        e.AppendContextLine(Compose("\n    in @[", first, "]"));
         e.SetPosition(currentToken.begin());
         throw;
     }

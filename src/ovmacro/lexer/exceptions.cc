@@ -13,9 +13,22 @@ LexScannerException::LexScannerException(const basic_xstring& message, BasicSubS
 LexScannerException::LexScannerException(const basic_xstring& message, const LSToken& token)
     : message_(message), position_(token.text.begin()) {}
 
+void LexScannerException::AppendContextLine(std::string_view line) {
+    if (line.size() <= static_cast<size_t>(kMaxContextLineLength)) {
+        message_.append(line);
+        return;
+    }
+    // Cut before a byte that continues a UTF-8 sequence, never inside one.
+    size_t cut = static_cast<size_t>(kMaxContextLineLength);
+    while (cut > 0 && (static_cast<unsigned char>(line[cut]) & 0xC0) == 0x80) --cut;
+    StringStream ss;
+    ss << line.substr(0, cut) << " ... (" << static_cast<int64>(line.size() - cut) << " more bytes)";
+    message_.append(ss.str());
+}
+
 void LexScannerException::AppendCallContextLine(std::string_view line) {
     if (callContextLines_ < kMaxCallContextLines) {
-        message_.append(line);
+        AppendContextLine(line);
         ++callContextLines_;
     } else {
         ++omittedCallContextLines_;

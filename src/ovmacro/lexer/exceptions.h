@@ -33,12 +33,16 @@ public:
     const basic_xstring& GetMessage() const { return message_; }
     basic_xstring& GetMessage() { return message_; }
     void AppendToMessage(std::string_view text) { message_.append(text); }
-    // Appends a context line of a call chain (an invocation, an argument). Past kMaxCallContextLines of them
-    // the lines are only counted, so that an error deep in a recursion stays readable; the outermost
-    // expansion then says how many were left out (AppendOmittedContextCount).
+    // Appends a context line (it begins with a line feed), shortened to kMaxContextLineLength bytes and a
+    // note of how many were left out, so that an error in a huge generated text stays readable.
+    void AppendContextLine(std::string_view line);
+    // Appends a context line of a call chain (an invocation, an argument, a loop item). Past
+    // kMaxCallContextLines of them the lines are only counted, so that an error deep in a recursion stays
+    // readable; the outermost expansion then says how many were left out (AppendOmittedContextCount).
     void AppendCallContextLine(std::string_view line);
     void AppendOmittedContextCount();
     static constexpr int64 kMaxCallContextLines = 24;
+    static constexpr int64 kMaxContextLineLength = 240;
     const char* GetPosition() const { return position_; }
     void SetPosition(const char* p) { position_ = p; }
     const basic_xstring& GetFileName() const { return fileName_; }

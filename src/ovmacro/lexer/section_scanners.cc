@@ -6,6 +6,7 @@
 
 #include "ovmacro/foundations/compose.h"
 #include "ovmacro/foundations/scanning.h"
+#include "ovmacro/lexer/bracket_index.h"
 #include "ovmacro/lexer/exceptions.h"
 #include "ovmacro/lexer/token_scanner.h"
 
@@ -64,9 +65,20 @@ void SkipBlanksWithoutLinefeed(BasicSubString& s) {
 }
 
 // Reads tokens after an opening bracket up to its matching closing bracket and returns that closing token;
-// `s` is left after it. At the end of the input `eosMessage` (+ `eosSuffix`) is raised there.
-LSToken ScanToMatchingClose(BasicSubString& s, EToken open, EToken close, const char* eosMessage,
-                            const char* eosSuffix) {
+// `s` is left after it. At the end of the input `eosMessage` (+ `eosSuffix`) is raised there. In deeply
+// nested expansions the ends of the brackets passed are recorded, and a recorded end is taken as it is.
+LSToken ScanToMatchingClose(BasicSubString& s, const char* afterOpen, EToken open, EToken close,
+                            const char* eosMessage, const char* eosSuffix, const char** insideEnd = nullptr) {
+    const bool recording = BracketScope::Recording();
+    LSToken found;
+    const char* lastEnd = afterOpen;  // the end of the last token read inside
+    if (recording && BracketScope::FindClose(afterOpen, found, lastEnd) && found.type == close) {
+        s.SetBegin(found.text.end());
+        if (insideEnd) *insideEnd = lastEnd;
+        return found;
+    }
+    xvector<const char*> opens;  // the ends of the opening brackets still open, outermost first
+    if (recording) opens.push_back(afterOpen);
     int64 depth = 1;
     for (;;) {
         const LSToken t = LsScanToken(s, false);
@@ -77,9 +89,18 @@ LSToken ScanToMatchingClose(BasicSubString& s, EToken open, EToken close, const 
         }
         if (t.type == open) {
             ++depth;
-        } else if (t.type == close && --depth == 0) {
-            return t;
+            if (recording) opens.push_back(t.text.end());
+        } else if (t.type == close) {
+            if (recording) {
+                BracketScope::RecordClose(opens.back(), t, std::max(lastEnd, opens.back()));
+                opens.pop_back();
+            }
+            if (--depth == 0) {
+                if (insideEnd) *insideEnd = lastEnd;
+                return t;
+            }
         }
+        lastEnd = t.text.end();
     }
 }
 
@@ -94,7 +115,7 @@ BasicSubString ScanBlockForm(BasicSubString& s, int64& indent, EToken open, ETok
         s.Advance(1);
     }
     const char* begin = s.begin();
-    const LSToken closing = ScanToMatchingClose(s, open, close, "Met EOS before closing ", closeText);
+    const LSToken closing = ScanToMatchingClose(s, t.text.end(), open, close, "Met EOS before closing ", closeText);
 
     // The line break and indentation in front of a closing bracket on a line of its own are layout, not
     // content. The look-back stops at the block's beginning: whatever lies before it is not part of the
@@ -128,7 +149,7 @@ BasicSubString ScanInlineForm(BasicSubString& s, EToken open, EToken close, cons
     if (!s.empty() && s.front() == '\n') s.Advance(1);
     const char* begin = s.begin();
     const LSToken closing =
-        ScanToMatchingClose(s, open, close, "Met EOS while reading bracketted string", "");
+        ScanToMatchingClose(s, t.text.end(), open, close, "Met EOS while reading bracketted string", "");
     return BasicSubString(begin, closing.text.begin());
 }
 
@@ -230,7 +251,10 @@ LSToken ScanArgument(BasicSubString& s, BasicSubString& arg, EToken terminator) 
     }
 
     arg = BasicSubString(start, start);
-    // Only one bracket kind is counted at a time, so "(a[b)" is one balanced group.
+    // Only one bracket kind is counted at a time, so "(a[b)" is one balanced group. In deeply nested
+    // expansions the ends of the groups are recorded and taken (see BracketScope).
+    const bool recording = BracketScope::Recording();
+    xvector<const char*> opens;
     EToken trackedOpen = TK_NONE;
     EToken trackedClose = TK_NONE;
     int64 depth = 0;
@@ -245,15 +269,26 @@ LSToken ScanArgument(BasicSubString& s, BasicSubString& arg, EToken terminator) 
         if (depth == 0) {
             if (t.type == TK_COMMA || t.type == terminator) return t;
             const EToken partner = ClosingPartner(t.type);
-            if (partner != TK_NONE) {
+            LSToken recorded;
+            const char* insideEnd = nullptr;
+            if (partner != TK_NONE && recording && BracketScope::FindClose(t.text.end(), recorded, insideEnd) &&
+                recorded.type == partner) {
+                s.SetBegin(recorded.text.end());
+            } else if (partner != TK_NONE) {
                 trackedOpen = t.type;
                 trackedClose = partner;
                 depth = 1;
+                if (recording) opens.push_back(t.text.end());
             }
         } else if (t.type == trackedOpen) {
             ++depth;
+            if (recording) opens.push_back(t.text.end());
         } else if (t.type == trackedClose) {
             --depth;
+            if (recording) {
+                BracketScope::RecordClose(opens.back(), t, std::max(arg.end(), opens.back()));
+                opens.pop_back();
+            }
         }
     }
 }
@@ -267,21 +302,14 @@ BasicSubString ScanBrackettedSection(BasicSubString& s, bool readOpen, EToken op
             throw LexScannerException(ss.GetString(), t);
         }
     }
+    const char* afterOpen = s.begin();
     ScanWhiteSpace(s);
-    // Leading comments belong to the section; trailing white space and comments do not, because the end only
-    // moves to the end of each token read.
-    BasicSubString section(s.begin(), s.begin());
-    int64 depth = 1;
-    for (;;) {
-        const LSToken t = LsScanToken(s, false);
-        if (t.type == TK_EOS) Fail("Met EOS while reading bracketted section", s.end());
-        if (t.type == open) {
-            ++depth;
-        } else if (t.type == close && --depth == 0) {
-            return section;
-        }
-        section.SetEnd(t.text.end());
-    }
+    // Leading comments belong to the section; trailing white space and comments do not: it ends with the end
+    // of the last token inside.
+    const char* begin = s.begin();
+    const char* insideEnd = begin;
+    ScanToMatchingClose(s, afterOpen, open, close, "Met EOS while reading bracketted section", "", &insideEnd);
+    return BasicSubString(begin, std::max(begin, insideEnd));
 }
 
 BasicSubString ScanRndBrackettedSection(BasicSubString& s, bool readOpen) {
