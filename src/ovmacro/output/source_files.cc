@@ -19,7 +19,19 @@ bool LineInText(const basic_xstring& text, const basic_xstring& name, const char
     return true;
 }
 
+thread_local ExpandingFiles* t_expandingFiles = nullptr;
+
 }  // namespace
+
+ExpandingFiles::ExpandingFiles(const MpfwSourceFileList& files) : files_(files), outer_(t_expandingFiles) {
+    t_expandingFiles = this;
+}
+
+ExpandingFiles::~ExpandingFiles() { t_expandingFiles = outer_; }
+
+bool ExpandingFiles::Locate(const char* pos, basic_xstring& fileName, int64& line) {
+    return t_expandingFiles && t_expandingFiles->files_.GetFilenameAndLineNumber(pos, fileName, line);
+}
 
 bool StringContainsPos(const basic_xstring& s, const char* pos) {
     // std::less gives a total order even for pointers into unrelated buffers.

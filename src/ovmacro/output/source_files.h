@@ -118,4 +118,20 @@ private:
     xvector<std::unique_ptr<MpfwSourceFile>> files_;
 };
 
+// The files whose expansion runs on this thread, for the directives that name the file and line of a
+// position (a Python traceback names the template's line): a host's loader opens one for each expansion.
+class ExpandingFiles {
+public:
+    explicit ExpandingFiles(const MpfwSourceFileList& files);
+    ~ExpandingFiles();
+    ExpandingFiles(const ExpandingFiles&) = delete;
+    ExpandingFiles& operator=(const ExpandingFiles&) = delete;
+    // The file and line of pos in the innermost list of files being expanded; false outside any.
+    static bool Locate(const char* pos, basic_xstring& fileName, int64& line);
+
+private:
+    const MpfwSourceFileList& files_;
+    ExpandingFiles* outer_;
+};
+
 }  // namespace orvan

@@ -33,10 +33,12 @@ bool s_pythonAllowed = true;
 
 constexpr const char* kModuleName = "stream_hooks";
 
-// Python 3's print() calls flush() when asked to, and shut-down flushes sys.stdout and sys.stderr, so both
-// replacement streams need one.
+// Python 3's print() calls flush() when asked to, and shut-down flushes sys.stdout and sys.stderr, so the
+// replacement streams need one. What a block writes to sys.stdout and sys.stderr reaches the host's standard
+// output and standard error; the text of an error goes into s_errorString through a stream of its own (see
+// GetPythonError). The calls that would end the host process from a block raise an error instead.
 constexpr const char* kBootstrap =
-    "import sys\n"
+    "import sys, os, posix, signal\n"
     "import stream_hooks\n"
     "class myStdOut:\n"
     "  def write(self,string):\n"
@@ -46,8 +48,53 @@ constexpr const char* kBootstrap =
     "  def write(self,string):\n"
     "    stream_hooks.WriteToStdErr(string);\n"
     "  def flush(self): pass\n"
+    "class myErrorText:\n"
+    "  def write(self,string):\n"
+    "    stream_hooks.WriteToErrorText(string);\n"
+    "  def flush(self): pass\n"
     "sys.stdout = myStdOut()\n"
-    "sys.stderr = myStdErr()\n";
+    "sys.stderr = myStdErr()\n"
+    "stream_hooks.error_text = myErrorText()\n"
+    "def _orvan_refuse(name):\n"
+    "  def refused(*args, **kwargs):\n"
+    "    raise RuntimeError(name + '() would end the process that expands this text')\n"
+    "  return refused\n"
+    "for _m in (os, posix):\n"
+    "  for _n in ('_exit', 'abort', 'execv', 'execve', 'execl', 'execle', 'execlp', 'execlpe', 'execvp',\n"
+    "             'execvpe', 'fexecve'):\n"
+    "    if hasattr(_m, _n): setattr(_m, _n, _orvan_refuse(_m.__name__ + '.' + _n))\n"
+    "def _orvan_signals(kill, killpg):\n"
+    "  def own(pid): return pid in (0, -1, os.getpid()) or -pid == os.getpgrp()\n"
+    "  def safe_kill(pid, sig):\n"
+    "    if own(pid) and sig != 0: raise RuntimeError('os.kill() would end the process that expands this text')\n"
+    "    return kill(pid, sig)\n"
+    "  def safe_killpg(pgid, sig):\n"
+    "    if pgid in (0, os.getpgrp()) and sig != 0:\n"
+    "      raise RuntimeError('os.killpg() would end the process that expands this text')\n"
+    "    return killpg(pgid, sig)\n"
+    "  return safe_kill, safe_killpg\n"
+    "os.kill, os.killpg = _orvan_signals(os.kill, os.killpg)\n"
+    "posix.kill, posix.killpg = os.kill, os.killpg\n"
+    "for _n in ('raise_signal', 'pthread_kill'):\n"
+    "  if hasattr(signal, _n): setattr(signal, _n, _orvan_refuse('signal.' + _n))\n"
+    "del _m, _n, _orvan_refuse, _orvan_signals\n"
+    // A traceback shows the code that ran, at the template lines it was compiled for, whatever the file on
+    // disk holds; the lines of every block compiled under one name are kept.
+    "import linecache\n"
+    "def _orvan_register_lines(name, text):\n"
+    "  entry = linecache.cache.get(name)\n"
+    "  lines = list(entry[2]) if entry and len(entry) == 4 else []\n"
+    "  new = text.splitlines(True)\n"
+    "  lines += ['\\n'] * (len(new) - len(lines))\n"
+    "  for i, line in enumerate(new):\n"
+    "    if line.strip(): lines[i] = line\n"
+    "  linecache.cache[name] = (sum(map(len, lines)), None, lines, name)\n"
+    "stream_hooks.register_lines = _orvan_register_lines\n"
+    "import traceback\n"
+    "def _orvan_print_error(etype, value, tb):\n"
+    "  traceback.print_exception(etype, value, tb, file=stream_hooks.error_text)\n"
+    "stream_hooks.print_error = _orvan_print_error\n"
+    "del _orvan_register_lines, _orvan_print_error\n";
 
 // The C API takes zero-terminated code, so a zero byte would silently cut the code short.
 constexpr const char* kZeroByteInCode = "source code string cannot contain null bytes";
@@ -59,6 +106,7 @@ constexpr size_t kMaxListDepth = 1000;
 PyMethodDef s_streamHooksMethods[] = {
     {"WriteToStdOut", WriteToStdOut, METH_VARARGS, "Write to stdout"},
     {"WriteToStdErr", WriteToStdErr, METH_VARARGS, "Write to stderr"},
+    {"WriteToErrorText", WriteToErrorText, METH_VARARGS, "Write to the text of the error being reported"},
     {nullptr, nullptr, 0, nullptr},
 };
 
@@ -90,32 +138,21 @@ basic_xstring StartInterpreter() {
         return "PyImport_AppendInittab failed";
     // Without signal handlers: the host keeps its own handling of SIGINT and friends.
     Py_InitializeEx(0);
-    if (PyRun_SimpleStringFlags(kBootstrap, nullptr) != 0)
-        return "PyRun_SimpleString failed on the orvan bootstrap code";
     PyObject* mainModule = PyImport_AddModule("__main__");
     if (mainModule == nullptr) return "PyImport_AddModule failed for the __main__ module";
     PyObject* mainDict = PyModule_GetDict(mainModule);
     if (PyDict_GetItemString(mainDict, "__builtins__") == nullptr)
         return "__main__ module is missing __builtins__";
+    // Compiled under a name of its own, which a traceback through a refused call shows.
+    PyObjectRef bootstrap(Py_CompileString(kBootstrap, "<ovmacro>", Py_file_input));
+    PyObjectRef ran(bootstrap ? PyEval_EvalCode(bootstrap.Get(), mainDict, mainDict) : nullptr);
+    if (!ran) {
+        PyErr_Clear();
+        return "the bridge's bootstrap code failed";
+    }
     s_mainModule = mainModule;
     s_mainDict = mainDict;
     return {};
-}
-
-// PyErr_Print ends the process for SystemExit; a macro text calling sys.exit() must not end its host, so
-// that exception is printed the way PyErr_Print prints any other.
-void PrintSystemExit() {
-    PyObject* type = nullptr;
-    PyObject* value = nullptr;
-    PyObject* traceback = nullptr;
-    PyErr_Fetch(&type, &value, &traceback);
-    PyErr_NormalizeException(&type, &value, &traceback);
-    if (value != nullptr && traceback != nullptr) PyException_SetTraceback(value, traceback);
-    PyErr_Display(type, value != nullptr ? value : Py_None, traceback);
-    Py_XDECREF(type);
-    Py_XDECREF(value);
-    Py_XDECREF(traceback);
-    PyErr_Clear();
 }
 
 // Python's error for a failed conversion, as the detail of a conversion error.
@@ -284,10 +321,27 @@ bool GetPythonError(basic_xstring& text) {
         return false;
     }
     s_errorString.clear();
-    if (PyErr_ExceptionMatches(PyExc_SystemExit))
-        PrintSystemExit();
-    else
-        PyErr_Print();
+    // Printed by Python's traceback module into s_errorString, whatever the code did to sys.stderr, and
+    // without PyErr_Print's ending of the process for SystemExit. A traceback shows the lines registered for
+    // the code that ran (RunPython).
+    PyObject* type = nullptr;
+    PyObject* value = nullptr;
+    PyObject* traceback = nullptr;
+    PyErr_Fetch(&type, &value, &traceback);
+    PyErr_NormalizeException(&type, &value, &traceback);
+    if (value != nullptr && traceback != nullptr) PyException_SetTraceback(value, traceback);
+    PyObject* hooks = PyImport_AddModule(kModuleName);
+    PyObjectRef printed(hooks ? PyObject_CallMethod(hooks, "print_error", "OOO", type, value ? value : Py_None,
+                                                    traceback ? traceback : Py_None)
+                              : nullptr);
+    if (!printed) {
+        PyErr_Clear();
+        s_errorString << (type ? reinterpret_cast<PyTypeObject*>(type)->tp_name : "error")
+                      << " (its traceback could not be printed)\n";
+    }
+    Py_XDECREF(type);
+    Py_XDECREF(value);
+    Py_XDECREF(traceback);
     s_errorString.GetString(text, true);
     return true;
 }
@@ -323,6 +377,12 @@ void RunPython(const basic_xstring& fileName, const basic_xstring& code, const c
     InitPythonFromParser(position);
     if (ContainsZeroByte(code)) Raise("Python compilation error: ", kZeroByteInCode, position);
     basic_xstring error;
+    if (PyObject* hooks = PyImport_AddModule(kModuleName)) {
+        PyObjectRef registered(PyObject_CallMethod(hooks, "register_lines", "s#s#", fileName.data(),
+                                                   static_cast<Py_ssize_t>(fileName.size()), code.data(),
+                                                   static_cast<Py_ssize_t>(code.size())));
+        if (!registered) PyErr_Clear();
+    }
     PyObjectRef compiled(Py_CompileStringFlags(code.c_str(), fileName.c_str(), Py_file_input, nullptr));
     if (!compiled) {
         GetPythonError(error);
@@ -357,6 +417,15 @@ _object* WriteToStdOut(_object* /*self*/, _object* args) {
 }
 
 _object* WriteToStdErr(_object* /*self*/, _object* args) {
+    const char* text = nullptr;
+    Py_ssize_t size = 0;
+    if (!PyArg_ParseTuple(args, "s#", &text, &size)) return nullptr;
+    xcerr().put(text, size);
+    xcerr().flush();
+    Py_RETURN_NONE;
+}
+
+_object* WriteToErrorText(_object* /*self*/, _object* args) {
     const char* text = nullptr;
     Py_ssize_t size = 0;
     if (!PyArg_ParseTuple(args, "s#", &text, &size)) return nullptr;

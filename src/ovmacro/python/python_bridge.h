@@ -3,7 +3,9 @@
 //
 // One interpreter serves the whole process. It starts with the first @runpython block or Python macro and
 // lives until UninitPython; names defined in `__main__` persist for that whole time. Python's sys.stdout goes
-// to xcout() and sys.stderr into s_errorString. All calls must come from one thread at a time.
+// to xcout() and sys.stderr to xcerr(); the text of an error goes into s_errorString. The calls that would end
+// the process (os._exit, os.abort, the os.exec family, signals to the process itself) raise an error instead.
+// All calls must come from one thread at a time.
 //
 //     basic_xstring value;
 //     RunPython("", "x = 6*7\n", position);
@@ -19,7 +21,7 @@ struct _object;
 
 namespace orvan {
 
-// Everything Python writes to sys.stderr; GetPythonError empties it.
+// The text of the Python error being read; GetPythonError empties it.
 extern StringStream s_errorString;
 
 // Owns one reference to a Python object and releases it when destroyed, which must happen before
@@ -68,5 +70,6 @@ void WritePythonObject(xostream& os, _object* object, const char* position);
 _object* PyInit_stream_hooks();
 _object* WriteToStdOut(_object* self, _object* args);
 _object* WriteToStdErr(_object* self, _object* args);
+_object* WriteToErrorText(_object* self, _object* args);
 
 }  // namespace orvan

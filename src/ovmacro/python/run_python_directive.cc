@@ -2,6 +2,7 @@
 #include "ovmacro/expander/macro_expander.h"
 #include "ovmacro/foundations/text_format.h"
 #include "ovmacro/lexer/section_scanners.h"
+#include "ovmacro/output/source_files.h"
 #include "ovmacro/python/python_bridge.h"
 
 namespace orvan {
@@ -70,14 +71,20 @@ void MacroExpander::ProcessRunPythonDirective() {
 
     // An empty block does nothing and, in particular, does not start the interpreter.
     if (!code.empty()) {
+        // Compiled under the template's name, its lines numbered as the template's, so that a traceback
+        // names the line the user wrote.
+        basic_xstring fileName = "<runpython>";
+        int64 firstLine = 1;
+        if (!ExpandingFiles::Locate(block.begin(), fileName, firstLine)) fileName = "<runpython>";
         StringStream program(4096);
+        program << basic_xstring(static_cast<size_t>(firstLine > 1 ? firstLine - 1 : 0), '\n');
         if (indent > 0)
             WriteSubStringWithAdjustedIndent(program, BasicSubString(code), indent);
         else
             program << RemoveCommonIndentation(code);
         program << '\n';
         try {
-            RunPython("", program.GetString(), position);
+            RunPython(fileName, program.GetString(), position);
         } catch (LexScannerException& e) {
             e.AppendToMessage("\n    in @runpython()\n");
             e.AppendToMessage(code);
