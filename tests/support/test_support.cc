@@ -19,6 +19,11 @@ extern char** environ;
 namespace orvan::testing {
 
 ToolResult RunTool(const std::vector<std::string>& args, const std::string& input, const std::string& workingDir) {
+    return RunTool(args, input, workingDir, {}, nullptr);
+}
+
+ToolResult RunTool(const std::vector<std::string>& args, const std::string& input, const std::string& workingDir,
+                   const std::vector<std::string>& prefix, const std::function<void(int pid)>& whileRunning) {
     // Standard input and the two outputs are files, so that no pipe can fill up and block either side.
     const TempDir io;
     const std::string in = io.Write("in", input), out = (io.path() / "out").string(),
@@ -29,14 +34,16 @@ ToolResult RunTool(const std::vector<std::string>& args, const std::string& inpu
     posix_spawn_file_actions_addopen(&actions, 1, out.c_str(), O_WRONLY | O_CREAT, 0600);
     posix_spawn_file_actions_addopen(&actions, 2, err.c_str(), O_WRONLY | O_CREAT, 0600);
     if (!workingDir.empty()) posix_spawn_file_actions_addchdir_np(&actions, workingDir.c_str());
-    std::string tool = OVMACRO_TOOL_PATH;
-    std::vector<std::string> copy = args;
-    std::vector<char*> argv{tool.data()};
-    for (std::string& a : copy) argv.push_back(a.data());
+    std::vector<std::string> words = prefix;
+    words.push_back(OVMACRO_TOOL_PATH);
+    words.insert(words.end(), args.begin(), args.end());
+    std::vector<char*> argv;
+    for (std::string& w : words) argv.push_back(w.data());
     argv.push_back(nullptr);
     pid_t pid = 0;
     ToolResult r;
-    if (posix_spawn(&pid, tool.c_str(), &actions, nullptr, argv.data(), environ) == 0) {
+    if (posix_spawnp(&pid, argv[0], &actions, nullptr, argv.data(), environ) == 0) {
+        if (whileRunning) whileRunning(pid);
         int status = 0;
         ::waitpid(pid, &status, 0);
         r.exitCode = WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status);

@@ -26,6 +26,10 @@ struct ToolResult {
 // Runs the ovmacro tool built with the tests, with the given arguments and standard input, in workingDir.
 ToolResult RunTool(const std::vector<std::string>& args, const std::string& input = "",
                    const std::string& workingDir = "");
+// The same, with `prefix` run instead, the tool and its arguments after it (for example a command that drops
+// privileges), and `whileRunning` called with the process id once it runs, before it is waited for.
+ToolResult RunTool(const std::vector<std::string>& args, const std::string& input, const std::string& workingDir,
+                   const std::vector<std::string>& prefix, const std::function<void(int pid)>& whileRunning);
 
 // A fresh folder under the system's temporary folder, removed with everything in it when destroyed.
 class TempDir {

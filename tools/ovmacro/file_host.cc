@@ -39,6 +39,15 @@ bool IsRegularFile(const std::string& path) {
 FileHost::FileHost(MpfwFrame& frame, std::vector<std::string> includeDirs)
     : MpfwParser(frame), includeDirs_(std::move(includeDirs)) {}
 
+void FileHost::Restrict(const std::string& inputPath, long long maxOutput) {
+    MpfwRestrictions restrictions;
+    const std::string inputFolder = inputPath == "-" ? "" : DirectoryOf(inputPath);
+    restrictions.importFolders.push_back(inputFolder.empty() ? "." : inputFolder);
+    for (const std::string& dir : includeDirs_) restrictions.importFolders.push_back(dir);
+    restrictions.outputLimit = maxOutput;
+    MpfwParser::Restrict(std::move(restrictions));
+}
+
 FileHost::Load FileHost::LoadFile(const std::string& path, std::string& error) {
     const std::string name = NameFor(path);
     loadedByUser_.insert(name);

@@ -37,6 +37,9 @@ public:
     // Loads and expands a text held in memory (standard input, the -D definitions) under a name that is no
     // path: imports from it are looked for from the working directory on.
     Load LoadText(const std::string& name, std::string text);
+    // --restricted: imports only from the folder of `inputPath` (the working directory for standard input)
+    // and the -I folders, no Python, and `maxOutput` as the bound of each expansion.
+    void Restrict(const std::string& inputPath, long long maxOutput);
     // The record of the last file or text given to LoadFile or LoadText (null before the first).
     orvan::MpfwSourceFile* LastLoaded() const { return lastLoaded_; }
 

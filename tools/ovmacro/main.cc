@@ -2,6 +2,7 @@
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
+#include <new>
 #include <string>
 #include <utility>
 #include <vector>
@@ -10,7 +11,9 @@
 #include "file_host.h"
 #include "line_markers.h"
 #include "options.h"
+#include "output_files.h"
 #include "output_runs.h"
+#include "ovmacro/expander/nesting_guard.h"
 #include "ovmacro/foundations/files.h"
 #include "ovmacro/python/python_bridge.h"
 #include "source_locator.h"
@@ -18,6 +21,9 @@
 
 using namespace orvan;
 using ovmacro_tool::FileHost;
+using ovmacro_tool::FileIdentity;
+using ovmacro_tool::IdentityOfExistingFile;
+using ovmacro_tool::OutputFiles;
 using ovmacro_tool::Options;
 using ovmacro_tool::OutputRun;
 using ovmacro_tool::SourceLocator;
@@ -26,24 +32,6 @@ namespace {
 
 constexpr int kExitExpansionError = 1;
 constexpr int kExitUsage = 2;
-
-// Writes the whole text to `path` through a temporary file beside it, so that OUT is replaced only whole.
-bool WriteFileAtomically(const std::string& path, const std::string& text, std::string& error) {
-    const std::string temp = path + ".ovmacro-tmp";
-    std::FILE* f = std::fopen(temp.c_str(), "wb");
-    if (!f) {
-        error = std::strerror(errno);
-        return false;
-    }
-    const bool written = std::fwrite(text.data(), 1, text.size(), f) == text.size();
-    const bool closed = std::fclose(f) == 0;
-    if (!written || !closed || std::rename(temp.c_str(), path.c_str()) != 0) {
-        error = std::strerror(errno);
-        std::remove(temp.c_str());
-        return false;
-    }
-    return true;
-}
 
 // The -D definitions as the lines of a text that is expanded before FILE, one "@def" line each, so that an
 // error in one is reported at its line of "<command line>".
@@ -55,11 +43,11 @@ std::string DefinitionsText(const Options& options) {
     return text;
 }
 
-// A file name as Make reads it: blanks, '#' and '$' would otherwise end or change the name.
+// A file name as Make reads it: blanks, '#', ':' and '$' would otherwise end or change the name.
 std::string MakeEscaped(const std::string& name) {
     std::string out;
     for (char c : name) {
-        if (c == ' ' || c == '\t' || c == '#') out += '\\';
+        if (c == ' ' || c == '\t' || c == '#' || c == ':') out += '\\';
         if (c == '$') out += '$';
         out += c;
     }
@@ -69,7 +57,8 @@ std::string MakeEscaped(const std::string& name) {
 // "TARGET: FILE IMPORTED...", then an empty rule for each imported file, so that Make does not fail when
 // one of them is removed.
 std::string DependencyText(const Options& options, const FileHost& host) {
-    const std::string target = options.outputPath.empty() ? options.inputPath : options.outputPath;
+    const bool toFile = !options.outputPath.empty() && options.outputPath != "-";
+    const std::string target = toFile ? options.outputPath : options.inputPath;
     const std::vector<std::string> imported = host.ImportedFileNames();
     std::string text = MakeEscaped(target) + ":";
     if (options.inputPath != "-") text += " " + MakeEscaped(options.inputPath);
@@ -79,9 +68,61 @@ std::string DependencyText(const Options& options, const FileHost& host) {
     return text;
 }
 
-}  // namespace
+// The outputs that this run writes, with the options that name them, in the order committed.
+struct PlannedOutputs {
+    OutputFiles files;
+    std::vector<std::string> options;  // "-o", "--deps", "--source-map"
+    int out = -1, deps = -1, sourceMap = -1;
+};
 
-int main(int argc, char** argv) {
+// Registers the outputs and refuses, before anything is expanded or written, two options that name one
+// file, or an output that is the input file.
+bool PlanOutputs(const Options& options, PlannedOutputs& plan, std::string& error) {
+    auto add = [&](const std::string& path, const char* option, int& index) {
+        if (path.empty()) return true;
+        std::string reason;
+        if (!plan.files.Add(path, reason)) {
+            error = "cannot write " + path + ": " + reason;
+            return false;
+        }
+        index = static_cast<int>(plan.options.size());
+        plan.options.push_back(option);
+        return true;
+    };
+    if (!options.check && !add(options.outputPath, "-o", plan.out)) return false;
+    if (!add(options.depsPath, "--deps", plan.deps) || !add(options.sourceMapPath, "--source-map", plan.sourceMap))
+        return false;
+    for (size_t i = 0; i < plan.files.size(); ++i)
+        for (size_t j = i + 1; j < plan.files.size(); ++j)
+            if (plan.files.Identity(i) == plan.files.Identity(j)) {
+                error = plan.options[i] + " and " + plan.options[j] + " name the same file";
+                return false;
+            }
+    FileIdentity input;
+    if (options.inputPath != "-" && IdentityOfExistingFile(options.inputPath, input))
+        for (size_t i = 0; i < plan.files.size(); ++i)
+            if (plan.files.Identity(i) == input) {
+                error = plan.options[i] + " names the input file " + options.inputPath;
+                return false;
+            }
+    return true;
+}
+
+// Refuses an output that is a file the expansion has read (an imported file).
+bool OutputsAreNotLoaded(const PlannedOutputs& plan, const FileHost& host, std::string& error) {
+    for (const std::string& name : host.ImportedFileNames()) {
+        FileIdentity loaded;
+        if (!IdentityOfExistingFile(name, loaded)) continue;
+        for (size_t i = 0; i < plan.files.size(); ++i)
+            if (plan.files.Identity(i) == loaded) {
+                error = plan.options[i] + " names " + name + ", which the expansion reads";
+                return false;
+            }
+    }
+    return true;
+}
+
+int Run(int argc, char** argv) {
     Options options;
     std::string error;
     if (!ovmacro_tool::ParseOptions(argc, argv, options, error)) {
@@ -96,13 +137,20 @@ int main(int argc, char** argv) {
         std::printf("ovmacro %s\n", OVMACRO_VERSION);
         return 0;
     }
-    if (options.noPython) SetPythonAllowed(false);
+    PlannedOutputs outputs;
+    if (!PlanOutputs(options, outputs, error)) {
+        std::fprintf(stderr, "ovmacro: %s\n", error.c_str());
+        return kExitUsage;
+    }
+    if (options.noPython || options.restricted) SetPythonAllowed(false);
+    MacroNestingGuard::SetOutputLimit(options.maxOutput);
 
     // The list of loaded files outlives the frame, whose variables are named by views into their texts.
     MpfwSourceFileList files;
     MpfwFrame frame(files);
     FileHost host(frame, options.includeDirs);
     host.SetDiagnosticStyle(options.diagnostics);
+    if (options.restricted) host.Restrict(options.inputPath, options.maxOutput);
     // The map from the expansion back to the sources serves the settings (their errors), line markers and
     // source maps; without them it is not kept.
     host.SetKeepOutputPieces(options.settings || options.lineMarkers || !options.sourceMapPath.empty());
@@ -130,6 +178,10 @@ int main(int argc, char** argv) {
     std::fflush(stdout);  // text printed while expanding comes before what follows
 
     if (options.settings && !host.PrintSettings(xcout())) return kExitExpansionError;
+    if (!OutputsAreNotLoaded(outputs, host, error)) {
+        std::fprintf(stderr, "ovmacro: %s\n", error.c_str());
+        return kExitUsage;
+    }
 
     const MpfwSourceFile* root = host.LastLoaded();
     // The expansion is written as it stands; only line markers need a copy to write into.
@@ -150,24 +202,33 @@ int main(int argc, char** argv) {
     }
     if (options.check) return ovmacro_tool::CheckGeneratedFile(options.outputPath, *result);
 
-    if (options.outputPath.empty()) {
-        if (!options.settings && (std::fwrite(result->data(), 1, result->size(), stdout) != result->size() ||
-                                  std::fflush(stdout) != 0)) {
-            std::fprintf(stderr, "ovmacro: cannot write standard output\n");
-            return kExitUsage;
-        }
-    } else if (!WriteFileAtomically(options.outputPath, *result, error)) {
-        std::fprintf(stderr, "ovmacro: cannot write %s: %s\n", options.outputPath.c_str(), error.c_str());
+    if (options.outputPath.empty() && !options.settings &&
+        (std::fwrite(result->data(), 1, result->size(), stdout) != result->size() || std::fflush(stdout) != 0)) {
+        std::fprintf(stderr, "ovmacro: cannot write standard output\n");
         return kExitUsage;
     }
-    if (!options.depsPath.empty() &&
-        !WriteFileAtomically(options.depsPath, DependencyText(options, host), error)) {
-        std::fprintf(stderr, "ovmacro: cannot write %s: %s\n", options.depsPath.c_str(), error.c_str());
-        return kExitUsage;
-    }
-    if (!options.sourceMapPath.empty() && !WriteFileAtomically(options.sourceMapPath, sourceMap, error)) {
-        std::fprintf(stderr, "ovmacro: cannot write %s: %s\n", options.sourceMapPath.c_str(), error.c_str());
+    const std::string dependencies = options.depsPath.empty() ? "" : DependencyText(options, host);
+    const bool staged = (outputs.out < 0 || outputs.files.Stage(outputs.out, *result, error)) &&
+                        (outputs.deps < 0 || outputs.files.Stage(outputs.deps, dependencies, error)) &&
+                        (outputs.sourceMap < 0 || outputs.files.Stage(outputs.sourceMap, sourceMap, error));
+    if (!staged || !outputs.files.Commit(error)) {
+        std::fprintf(stderr, "ovmacro: %s\n", error.c_str());
         return kExitUsage;
     }
     return 0;
+}
+
+}  // namespace
+
+int main(int argc, char** argv) {
+    // The library reports its own allocation failures as located errors; one anywhere else ends the run
+    // with a report too, never with an abort.
+    try {
+        return Run(argc, argv);
+    } catch (const std::bad_alloc&) {
+        std::fputs("ovmacro: error: out of memory\n", stderr);
+    } catch (const std::exception& e) {
+        std::fprintf(stderr, "ovmacro: error: %s\n", e.what());
+    }
+    return kExitExpansionError;
 }

@@ -1,5 +1,7 @@
 #include "options.h"
 
+#include <limits>
+#include <string>
 #include <string_view>
 
 #include "ovmacro/foundations/scanning.h"
@@ -31,6 +33,22 @@ bool ParseDefine(const std::string& arg, Options& options, std::string& error) {
     return true;
 }
 
+// A size in bytes, with an optional K, M or G (powers of 1024).
+bool ParseSize(const std::string& text, long long& size) {
+    size_t end = 0;
+    long long value = 0;
+    try {
+        value = std::stoll(text, &end);
+    } catch (const std::exception&) {
+        return false;
+    }
+    const std::string suffix = text.substr(end);
+    const int shift = suffix.empty() ? 0 : suffix == "K" ? 10 : suffix == "M" ? 20 : suffix == "G" ? 30 : -1;
+    if (value <= 0 || shift < 0 || value > (std::numeric_limits<long long>::max() >> shift)) return false;
+    size = value << shift;
+    return true;
+}
+
 }  // namespace
 
 const char* UsageText() {
@@ -41,7 +59,8 @@ const char* UsageText() {
            "stays in the output.\n"
            "\n"
            "Options:\n"
-           "  -o OUT         write the expansion to OUT instead (only when the expansion succeeds)\n"
+           "  -o OUT         write the expansion to OUT instead, only when the expansion succeeds\n"
+           "                 (- is standard output); see Output files below\n"
            "  -D NAME=TEXT   define macro NAME with body TEXT before FILE is expanded, as a line\n"
            "                 \"@def NAME = TEXT\" at the top of FILE would; -D NAME defines NAME as\n"
            "                 true\n"
@@ -52,6 +71,15 @@ const char* UsageText() {
            "                 each dollar definition ($NAME = value) as NAME=VALUE; the expansion\n"
            "                 goes only to -o OUT\n"
            "  --no-python    refuse embedded Python code (@runpython, @defpython macros fail)\n"
+           "  --restricted   for templates you did not write: no embedded Python; imports only\n"
+           "                 from FILE's folder (the working directory for standard input) and\n"
+           "                 the -I folders, by relative names that do not lead out of them, also\n"
+           "                 through symlinks; --max-output defaults to 64M, and an expansion stops\n"
+           "                 after 4 million steps (macro calls, blocks, loop iterations)\n"
+           "  --max-output SIZE\n"
+           "                 stop with an error when an expansion has written more than SIZE\n"
+           "                 bytes, the text made inside directives included (a suffix K, M or G\n"
+           "                 multiplies by 1024, 1024^2, 1024^3); 2G by default\n"
            "  --deps DEPFILE also write a Make dependency file: \"TARGET: FILE IMPORTED...\" (TARGET\n"
            "                 is OUT, else FILE) and an empty rule for each imported file\n"
            "  --source-map MAPFILE\n"
@@ -92,9 +120,18 @@ const char* UsageText() {
            "since), but never after a line ending in a backslash, in a /* */ comment or in a raw\n"
            "string literal.\n"
            "\n"
+           "Output files: OUT, DEPFILE and MAPFILE are written only when every one of them can\n"
+           "be: each is written to a temporary file in its folder and renamed into place, so\n"
+           "that a file is replaced whole or not at all, even by a killed run or by runs that\n"
+           "write it at the same time. A replaced file keeps its mode; other hard links to it\n"
+           "keep the old content. A symlink is followed and its target replaced. A device or a\n"
+           "FIFO is written, never replaced, and a file whose folder is not writable is\n"
+           "rewritten in place. None of them may be FILE, a file that FILE imports, or one of\n"
+           "the others.\n"
+           "\n"
            "Exit status: 0 on success, 1 when the expansion or the settings fail (the error is\n"
            "reported on standard error) or --check finds OUT different or missing, 2 on a usage\n"
-           "error or an unreadable FILE or OUT.\n";
+           "error, an unreadable FILE or an output that cannot be written.\n";
 }
 
 bool ParseOptions(int argc, char** argv, Options& options, std::string& error) {
@@ -149,12 +186,33 @@ bool ParseOptions(int argc, char** argv, Options& options, std::string& error) {
                 error = "unknown diagnostics style '" + text + "' (expected default or gnu)";
                 return false;
             }
-        } else if (arg == "--deps") {
-            if (!value(options.depsPath)) return false;
-        } else if (arg.substr(0, 7) == "--deps=") {
-            options.depsPath = std::string(arg.substr(7));
+        } else if (arg == "--deps" || arg.substr(0, 7) == "--deps=") {
+            if (arg.size() > 6)
+                options.depsPath = std::string(arg.substr(7));
+            else if (!value(options.depsPath))
+                return false;
+            // "-" would be a file of that name, not standard output, which holds the expansion.
+            if (options.depsPath.empty() || options.depsPath == "-") {
+                error = "--deps needs a file name";
+                return false;
+            }
+        } else if (arg == "--restricted") {
+            options.restricted = true;
+        } else if (arg == "--max-output" || arg.substr(0, 13) == "--max-output=") {
+            if (arg.size() > 12)
+                text = std::string(arg.substr(13));
+            else if (!value(text))
+                return false;
+            if (!ParseSize(text, options.maxOutput)) {
+                error = "--max-output needs a size in bytes, with an optional K, M or G: " + text;
+                return false;
+            }
         } else if (arg.substr(0, 2) == "-o") {
             if (!shortValue(options.outputPath)) return false;
+            if (options.outputPath.empty()) {
+                error = "-o needs a file name (or - for standard output)";
+                return false;
+            }
         } else if (arg.substr(0, 2) == "-D") {
             if (!shortValue(text) || !ParseDefine(text, options, error)) return false;
         } else if (arg.substr(0, 2) == "-I") {
@@ -180,7 +238,12 @@ bool ParseOptions(int argc, char** argv, Options& options, std::string& error) {
         error = "--deps needs -o OUT when the input is standard input";
         return false;
     }
-    if (options.check && options.outputPath.empty()) {
+    if (options.maxOutput == 0) options.maxOutput = options.restricted ? kRestrictedMaxOutput : kDefaultMaxOutput;
+    if (options.settings && options.outputPath == "-") {
+        error = "-o - with --settings: the settings go to standard output";
+        return false;
+    }
+    if (options.check && (options.outputPath.empty() || options.outputPath == "-")) {
         error = "--check needs -o OUT, the file to compare with";
         return false;
     }

@@ -20,10 +20,16 @@ struct Options {
     bool noPython = false;     // --no-python: refuse embedded Python code
     bool lineMarkers = false;  // --line-markers: write #line markers into the expansion
     bool check = false;        // --check: compare the expansion with OUT instead of writing it
+    bool restricted = false;   // --restricted: for templates one did not write (see --help)
+    long long maxOutput = 0;   // --max-output: the bound on what an expansion produces, in bytes
     DiagnosticStyle diagnostics = DiagnosticStyle::kDefault;  // --diagnostics: the form of error reports
     bool help = false;
     bool version = false;
 };
+
+// The default bounds of --max-output, without and with --restricted.
+inline constexpr long long kDefaultMaxOutput = 2LL << 30;
+inline constexpr long long kRestrictedMaxOutput = 64LL << 20;
 
 // Parses argv; on a usage error returns false and sets `error`.
 bool ParseOptions(int argc, char** argv, Options& options, std::string& error);

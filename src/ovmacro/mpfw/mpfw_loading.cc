@@ -1,5 +1,6 @@
 // Loading project description files: reading, recording, expanding, and following their imports.
 #include <algorithm>
+#include <cstdlib>
 #include <memory>
 #include <utility>
 
@@ -7,6 +8,7 @@
 #include "ovmacro/foundations/files.h"
 #include "ovmacro/foundations/paths.h"
 #include "ovmacro/mpfw/mpfw_parser.h"
+#include "ovmacro/python/python_bridge.h"
 
 namespace orvan {
 
@@ -26,7 +28,65 @@ private:
     xvector<basic_xstring>& chain_;
 };
 
+// Sets Python and the bounds of a restricted load for its duration, and puts back what was set before.
+class RestrictedLoad {
+public:
+    RestrictedLoad(bool active, const MpfwRestrictions& r) : active_(active), python_(IsPythonAllowed()) {
+        if (!active_) return;
+        SetPythonAllowed(false);
+        MacroNestingGuard::SetOutputLimit(r.outputLimit);
+        MacroNestingGuard::SetExpansionLimit(r.expansionLimit);
+    }
+    ~RestrictedLoad() {
+        if (!active_) return;
+        SetPythonAllowed(python_);
+        MacroNestingGuard::SetOutputLimit(output_);
+        MacroNestingGuard::SetExpansionLimit(expansions_);
+    }
+    RestrictedLoad(const RestrictedLoad&) = delete;
+    RestrictedLoad& operator=(const RestrictedLoad&) = delete;
+
+private:
+    bool active_;
+    bool python_;
+    int64 output_ = MacroNestingGuard::OutputLimit();
+    int64 expansions_ = MacroNestingGuard::ExpansionLimit();
+};
+
+// The path with every symlink resolved, or empty when it leads nowhere.
+basic_xstring RealPath(const basic_xstring& path) {
+    char* real = ::realpath(path.c_str(), nullptr);
+    if (!real) return {};
+    basic_xstring result(real);
+    std::free(real);
+    return result;
+}
+
+bool IsInside(const basic_xstring& path, const basic_xstring& folder) {
+    if (folder == "/") return true;
+    return path.size() > folder.size() && path.compare(0, folder.size(), folder) == 0 && path[folder.size()] == '/';
+}
+
 }  // namespace
+
+void MpfwParser::Restrict(MpfwRestrictions restrictions) {
+    restricted_ = true;
+    restrictions_ = std::move(restrictions);
+    // Compared with the real path of each import, so resolved the same way once here.
+    for (basic_xstring& folder : restrictions_.importFolders) folder = RealPath(folder);
+}
+
+void MpfwParser::CheckImportAllowed(const basic_xstring& name, const basic_xstring& fullPath,
+                                    const char* position) const {
+    if (!restricted_) return;
+    if (!name.empty() && name.front() == '/')
+        throw LexScannerException("Import of " + name + " refused: an absolute path, in restricted mode", position);
+    const basic_xstring real = RealPath(fullPath);
+    for (const basic_xstring& folder : restrictions_.importFolders)
+        if (!real.empty() && !folder.empty() && IsInside(real, folder)) return;
+    throw LexScannerException("Import of " + name + " refused: it lies outside the folders allowed in restricted mode",
+                              position);
+}
 
 MpfwSourceFile* MpfwParser::CreateMpfwSourceFile() {
     return new MpfwSourceFile;
@@ -47,6 +107,8 @@ MpfwSourceFile* MpfwParser::AddFileWithText(const basic_xstring& name, basic_xst
     mpfwFrame->sourceFiles.AddSrcFile(owned.release());
 
     ExpansionChainEntry entry(expanding_, name);
+    const RestrictedLoad restrictedLoad(restricted_, restrictions_);
+    const ExpandingFiles expanding(mpfwFrame->sourceFiles);
     try {
         if (keepOutputPieces_)
             MacroExpand(this, &mpfwFrame->varFrame, BasicSubString(file->text), 0, 0, file->expandedText,
@@ -71,6 +133,8 @@ void MpfwParser::ReportError(const LexScannerException& e) {
 bool MpfwParser::HandleImportPath(const basic_xstring& path, const char* position) {
     basic_xstring dir = path;
     ApplyMacrosAt(dir, position);
+    if (restricted_ && !dir.empty() && dir.front() == '/')
+        throw LexScannerException("@importpath " + dir + " refused: an absolute path, in restricted mode", position);
     NormalisePath(dir);
     mpfwFrame->importPaths.push_back(std::move(dir));
     return true;
@@ -80,7 +144,9 @@ bool MpfwParser::HandleImport(VarFrame*, const basic_xstring& fileName, const ch
     basic_xstring name = fileName;
     ApplyMacrosAt(name, position);
     basic_xstring fullPath;
+    if (restricted_ && !name.empty() && name.front() == '/') CheckImportAllowed(name, name, position);
     if (!ResolveFile(name, fullPath)) throw LexScannerException("Couldn't open file " + name, position);
+    CheckImportAllowed(name, fullPath, position);
     // A file that imports itself, directly or through others, would be expanded again and again.
     if (std::find(expanding_.begin(), expanding_.end(), fullPath) != expanding_.end())
         throw LexScannerException("Recursive import of file " + fullPath, position);

@@ -22,10 +22,20 @@
 #pragma once
 
 #include "ovmacro/expander/import_handler.h"
+#include "ovmacro/expander/nesting_guard.h"
 #include "ovmacro/expr/expression_parser.h"
 #include "ovmacro/mpfw/mpfw_frame.h"
 
 namespace orvan {
+
+// What a host that expands texts it did not write (a service rendering its users' templates) lets them do.
+struct MpfwRestrictions {
+    // Imports must name a relative path that leads, symlinks followed, to a file inside one of these folders.
+    xvector<basic_xstring> importFolders;
+    // The bounds of each expansion (see MacroNestingGuard); embedded Python is refused as well.
+    int64 outputLimit = int64{64} << 20;
+    int64 expansionLimit = 4'000'000;
+};
 
 class MpfwParser : public ExpressionParser, public ImportHandler {
 public:
@@ -48,6 +58,10 @@ public:
     // A host that only writes the expanded texts, and neither reads settings from them nor maps their
     // positions back, saves the pieces' memory: a few pieces for every macro call.
     void SetKeepOutputPieces(bool keep) { keepOutputPieces_ = keep; }
+    // From now on, the files loaded run under `restrictions`: an import or @importpath that would leave the
+    // folders is refused with an error at the directive, before the file is read, and Python and the bounds
+    // are set for the time of each load.
+    void Restrict(MpfwRestrictions restrictions);
 
     // A directory in which later imports may be searched: dollar macros applied, normalised, appended to
     // the frame's import paths.
@@ -108,8 +122,13 @@ private:
     // ApplyMacros, placing an error without a position (a dollar macro that leads back to itself) at pos.
     bool ApplyMacrosAt(basic_xstring& text, const char* pos);
 
+    // Refuses, at position, an import that leaves the permitted folders (restricted mode only).
+    void CheckImportAllowed(const basic_xstring& name, const basic_xstring& fullPath, const char* position) const;
+
     xvector<basic_xstring> expanding_;
     bool keepOutputPieces_ = true;
+    bool restricted_ = false;
+    MpfwRestrictions restrictions_;
 };
 
 }  // namespace orvan
