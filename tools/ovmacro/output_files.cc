@@ -88,6 +88,36 @@ bool IdentityOfExistingFile(const std::string& path, FileIdentity& id) {
     return true;
 }
 
+// Writes into a temporary file through a buffer of bounded size; the first failure is kept for Commit.
+class OutputFiles::TempStream : public orvan::xostream {
+public:
+    explicit TempStream(int fd) : fd_(fd) { buffer_.reserve(kBufferSize); }
+    ~TempStream() override = default;
+    void flush() override {
+        if (error_ == 0 && !OutputFiles::WriteAll(fd_, buffer_)) error_ = errno;
+        buffer_.clear();
+    }
+    int error() const { return error_; }
+
+protected:
+    void DoWrite(const char* p, size_t n) override {
+        if (buffer_.size() + n > kBufferSize) flush();
+        if (n >= kBufferSize) {
+            if (error_ == 0 && !OutputFiles::WriteAll(fd_, std::string_view(p, n))) error_ = errno;
+        } else {
+            buffer_.append(p, n);
+        }
+    }
+
+private:
+    static constexpr size_t kBufferSize = 256 * 1024;
+    int fd_;
+    int error_ = 0;
+    std::string buffer_;
+};
+
+OutputFiles::OutputFiles() = default;
+
 OutputFiles::~OutputFiles() {
     for (Output& out : outputs_) {
         if (out.fd > 2) ::close(out.fd);
@@ -179,6 +209,18 @@ bool OutputFiles::StageReplacement(Output& out, std::string& error) {
     return true;
 }
 
+orvan::xostream* OutputFiles::StageStream(size_t index, std::string& error) {
+    Output& out = outputs_[index];
+    if (out.mode != Mode::kReplace) return nullptr;
+    if (!StageReplacement(out, error)) {
+        error = "cannot write " + out.path + ": " + error;
+        return nullptr;
+    }
+    if (out.mode != Mode::kReplace) return nullptr;  // rewritten in place: staged whole instead
+    out.stream = std::make_unique<TempStream>(out.fd);
+    return out.stream.get();
+}
+
 bool OutputFiles::Stage(size_t index, std::string_view text, std::string& error) {
     Output& out = outputs_[index];
     out.text = text;
@@ -193,6 +235,11 @@ bool OutputFiles::Commit(std::string& error) {
         error = "cannot write " + out.path + ": " + std::strerror(reason);
         return false;  // the destructor removes every temporary name
     };
+    for (Output& out : outputs_) {
+        if (!out.stream) continue;
+        out.stream->flush();
+        if (out.stream->error() != 0) return fail(out, out.stream->error());
+    }
     // Unnamed temporary files get a name of their own, beside their target, first: a failure here replaces
     // nothing.
     for (Output& out : outputs_) {

@@ -21,6 +21,8 @@
 // The frame, its list and the recorded files must outlive the parser.
 #pragma once
 
+#include <memory>
+
 #include "ovmacro/expander/import_handler.h"
 #include "ovmacro/expander/nesting_guard.h"
 #include "ovmacro/expr/expression_parser.h"
@@ -58,6 +60,14 @@ public:
     // A host that only writes the expanded texts, and neither reads settings from them nor maps their
     // positions back, saves the pieces' memory: a few pieces for every macro call.
     void SetKeepOutputPieces(bool keep) { keepOutputPieces_ = keep; }
+    // Writes the expansion of the next file loaded at the top (not through an import) into `stream` as it is
+    // made, instead of keeping it in the file's record (whose expandedText stays empty, without pieces): a host
+    // that only writes the expansion out needs no memory for it. What reached the stream before an error stays
+    // there; the host discards it.
+    void StreamNextExpansion(xostream* stream) { stream_ = stream; }
+    // Whether AddFile maps a large file into memory instead of reading it (the record's text then stays empty;
+    // its Text() is the mapping): a host that reads the records' texts through Text() saves the copy.
+    void SetMapLargeFiles(bool map) { mapLargeFiles_ = map; }
     // From now on, the files loaded run under `restrictions`: an import or @importpath that would leave the
     // folders is refused with an error at the directive, before the file is read, and Python and the bounds
     // are set for the time of each load.
@@ -127,6 +137,10 @@ private:
 
     xvector<basic_xstring> expanding_;
     bool keepOutputPieces_ = true;
+    xostream* stream_ = nullptr;
+    bool mapLargeFiles_ = false;
+    // Records the file (its text or its mapping set) and expands it.
+    MpfwSourceFile* AddFileRecord(std::unique_ptr<MpfwSourceFile> file);
     bool restricted_ = false;
     MpfwRestrictions restrictions_;
 };
