@@ -1,5 +1,6 @@
 // The expander's fast paths against its general way: the plain-text lane, which skips quiet bytes sixteen at a
-// time while no variable has a name yet, and macro bodies that are plain text apart from their arguments.
+// time while no variable has a name yet, macro bodies that are plain text apart from their arguments, loop
+// blocks cut once into parts, and @str of a name.
 #include <gtest/gtest.h>
 
 #include <random>
@@ -124,6 +125,29 @@ TEST(PlainBodyTest, ExpandsLikeTheGeneralWay) {
     const std::string deep = "@def m(a) = {<a>%%}\n" + calls;
     EXPECT_NE(ExpandWithMarks(deep, "").find("nested too deeply"), std::string::npos);
     EXPECT_EQ(ExpandWithMarks(deep, ""), ExpandWithMarks(deep, "@@"));
+}
+
+// Loop blocks cut once into parts, and @str of a name whose value is ordinary text, against the general way
+// that "@@" forces on them: items that are not ordinary text, names of variables, errors in an iteration.
+TEST(LoopBlockTest, ExpandsLikeTheGeneralWay) {
+    const std::pair<std::string, std::string> cases[] = {  // text, the start of its outcome
+        {"@for(x in [a, b c]){[x] @str(x),%%}\n", "[a] \"a\",[b c] \"b c\",\n"},
+        {"enum {\n    @for(n in [RED, GREEN])\n    {\n        %%n = 1 << n,\n\n    }\n};\n", "enum {\n    RED = 1 << RED,\n    GREEN"},
+        {"@for((k, v) in [(1, one), (2, `t,w`)]){k=v;%%}", "1=one;2=t,w;"},
+        {"@def g = {G}\n@for(x in [g, h, 'q', \"s\\\\\"]){<x>@str(x)%%}", "<G>\"G\"<h>\"h\"<'q'>\"'q'\"<\"s\\\\\">"},
+        {"@def y = {Y}\n@for(x in [1, y]){x y x%%}", "1 Y 1Y Y Y"},
+        {"@for(x in [1,2]){@for(y in [a,b]){x.y %%}}", "1.a 1.b 2.a 2.b "},
+        {"@for(x in [`a\nb`, c]){  x @str(x)%%}", "  a\n  b \"a\\nb\"  c \"c\""},
+        {"@for(x in [1, @fail(\"deep\")]){x%%}", "error@19 deep"},
+        {"@for(x in [1, 2]){x @if(x){}%%}", "error@20 No implicit conversion from int64 to bool"},
+        {"@def X = {hello}\n@let int n = 3\n@def q = {\"a\\\\\"}\n@str(X%%)@str(n%%)@str(q%%)@str(Z%%)@strx(X%%)",
+         "\"hello\"\"3\"\"\\\"a\\\\\\\\\\\"\"\"Z\"\"hello\""},
+    };
+    for (const auto& [text, expected] : cases) {
+        const std::string fast = ExpandWithMarks(text, "");
+        EXPECT_EQ(fast.substr(0, expected.size()), expected) << text;
+        EXPECT_EQ(fast, ExpandWithMarks(text, "@@")) << text;
+    }
 }
 
 }  // namespace

@@ -158,6 +158,7 @@ int Run(int argc, char** argv) {
     // source maps; without them it is not kept.
     host.SetKeepOutputPieces(options.settings || options.lineMarkers || !options.sourceMapPath.empty());
     host.SetMapLargeFiles(true);
+    ovmacro_tool::EndRunWhenAMappedInputShrinks();
 
     if (!options.defines.empty() &&
         host.LoadText("<command line>", DefinitionsText(options)) != FileHost::Load::kOk)

@@ -41,6 +41,18 @@ void RegisterTempName(const std::string& name) {
     }
 }
 
+extern "C" void EndRunOnShrunkInput(int signal, siginfo_t* info, void*) {
+    if (info->si_code != BUS_ADRERR) {  // not a page beyond a file's end: the fault it is
+        std::signal(signal, SIG_DFL);
+        return;
+    }
+    for (int i = 0; i < kTempSlots; ++i)
+        if (g_tempInUse[i]) ::unlink(g_tempNames[i]);
+    static const char kMessage[] = "ovmacro: an input file was shortened while it was read; nothing was written\n";
+    (void)!::write(2, kMessage, sizeof kMessage - 1);
+    ::_exit(1);
+}
+
 void ForgetTempName(const std::string& name) {
     for (int i = 0; i < kTempSlots; ++i)
         if (g_tempInUse[i] && name == g_tempNames[i]) g_tempInUse[i] = 0;
@@ -273,6 +285,14 @@ bool OutputFiles::Commit(std::string& error) {
         out.tempName.clear();
     }
     return true;
+}
+
+void EndRunWhenAMappedInputShrinks() {
+    struct sigaction action {};
+    action.sa_sigaction = EndRunOnShrunkInput;
+    action.sa_flags = SA_SIGINFO;
+    sigemptyset(&action.sa_mask);
+    ::sigaction(SIGBUS, &action, nullptr);
 }
 
 }  // namespace ovmacro_tool

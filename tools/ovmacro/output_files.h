@@ -80,4 +80,9 @@ private:
     std::vector<Output> outputs_;
 };
 
+// A mapped input faults when another process shortens the file during the run. From this call on, such a
+// fault ends the run with a message and exit status 1 instead of a crash: the temporary files are removed and
+// nothing has been committed, since every output is committed after the inputs were read.
+void EndRunWhenAMappedInputShrinks();
+
 }  // namespace ovmacro_tool

@@ -1,7 +1,10 @@
 // @for over a list or a list of tuples, and @while: expand a block once per item or while a condition holds.
+#include <algorithm>
+
 #include "ovmacro/expander/directive_text.h"
 #include "ovmacro/expander/held_text.h"
 #include "ovmacro/expander/macro_expander.h"
+#include "ovmacro/expander/plain_text.h"
 #include "ovmacro/foundations/compose.h"
 #include "ovmacro/lexer/section_scanners.h"
 #include "ovmacro/lexer/token_scanner.h"
@@ -71,6 +74,12 @@ void MacroExpander::ProcessForDirective() {
     BasicSubString items(list);
     const LSToken open = LsScanToken(items, false);
     if (open.type != TK_LBRACKET) throw listError(Compose("[ expected when read ", open));
+    if (names.empty()) names.push_back(singleName);
+    // A block of ordinary text, loop names and @str of them is cut once and written item by item.
+    LoopBlockPlan plan;
+    const bool planned = PlanLoopBlock(block, indent, names, frame, plan);
+    const bool dollarMacrosActive = planned && DollarMacrosActive(frame);
+    xvector<BasicSubString> values(names.size());
     for (;;) {
         BasicSubString item;
         LSToken end;
@@ -83,18 +92,16 @@ void MacroExpander::ProcessForDirective() {
         }
         if (end.type != TK_COMMA && item.empty()) break;
 
-        VarFrame iterationFrame(frame);
-        if (names.empty()) {
-            BindLoopName(iterationFrame, frame, singleName, item);
+        if (singleName) {
+            values[0] = item;
         } else {
-            BasicSubString values = item;
-            const LSToken tupleOpen = LsScanToken(values, false);
+            BasicSubString rest = item;
+            const LSToken tupleOpen = LsScanToken(rest, false);
             if (tupleOpen.type != TK_LPAREN) throw listError(Compose("( expected when read ", tupleOpen));
             for (size_t i = 0; i < names.size(); ++i) {
-                BasicSubString value;
                 LSToken valueEnd;
                 try {
-                    valueEnd = ScanArgument(values, value, TK_RPAREN);
+                    valueEnd = ScanArgument(rest, values[i], TK_RPAREN);
                 } catch (LexScannerException& e) {
                     e.AppendContextLine(Compose("\n    in @for directive for list ", list));
                     e.SetPosition(listPosition);
@@ -103,11 +110,21 @@ void MacroExpander::ProcessForDirective() {
                 const bool last = i + 1 == names.size();
                 if (!last && valueEnd.type != TK_COMMA) throw listError(Compose(", expected when read ", valueEnd));
                 if (last && valueEnd.type != TK_RPAREN) throw listError(Compose(") expected when read ", valueEnd));
-                BindLoopName(iterationFrame, frame, names[i], value);
             }
         }
+        const bool plain = planned && std::all_of(plan.begin(), plan.end(), [&](const LoopBlockPart& part) {
+            return part.kind == LoopBlockPart::kText ||
+                   (IsPlainLoopItem(values[part.name], frame, dollarMacrosActive) &&
+                    (part.kind == LoopBlockPart::kName || !values[part.name].empty()));
+        });
         try {
-            MacroExpand(nullptr, &iterationFrame, block, indent, blockOutputIndent, *output);
+            if (plain) {
+                WritePlannedIteration(plan, values, block, blockOutputIndent);
+            } else {
+                VarFrame iterationFrame(frame);
+                for (size_t i = 0; i < names.size(); ++i) BindLoopName(iterationFrame, frame, names[i], values[i]);
+                MacroExpand(nullptr, &iterationFrame, block, indent, blockOutputIndent, *output);
+            }
         } catch (LexScannerException& e) {
             held.MovePositionOut(e);
             // A call-chain line: a block that invokes itself would otherwise add one line per level.

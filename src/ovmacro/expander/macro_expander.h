@@ -17,6 +17,7 @@
 #include <span>
 
 #include "ovmacro/expander/import_handler.h"
+#include "ovmacro/expander/loop_block.h"
 #include "ovmacro/lexer/token.h"
 #include "ovmacro/output/expanded_output.h"
 #include "ovmacro/vars/var_frame.h"
@@ -92,6 +93,9 @@ private:
     bool ParseBoolExpressionInBrackets(BasicSubString directiveName);
     void ProcessWhileDirective();
     void ProcessForDirective();
+    // One iteration of a @for block cut by PlanLoopBlock (loop_block.h), with the items of its loop names.
+    void WritePlannedIteration(const LoopBlockPlan& plan, std::span<const BasicSubString> items, BasicSubString block,
+                               int64 blockOutputIndent);
     // Assignment and scope.
     void ProcessLetDirective();
     void ProcessDollarDefDirective();

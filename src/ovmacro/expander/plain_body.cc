@@ -117,21 +117,6 @@ private:
 // library with dlopen.
 thread_local PlainBodySplits t_splits;
 
-// Whether an argument expands to itself in `frame`: ordinary text, and names that no variable there has.
-// Whatever would raise an error (a lookup, the scanner) leaves it to the expansion, which reports it.
-bool IsOrdinaryTextIn(BasicSubString text, VarFrame* frame, bool dollarMacrosActive) {
-    try {
-        for (const char* p = text.begin();;) {
-            const PlainTextRun run = SkipPlainText(p, text.end(), false, dollarMacrosActive);
-            if (run.stop == text.end()) return true;
-            if (!run.nameEnd || frame->Find(BasicSubString(run.stop, run.nameEnd), run.nameEnd)) return false;
-            p = run.nameEnd;
-        }
-    } catch (const LexScannerException&) {
-        return false;
-    }
-}
-
 }  // namespace
 
 bool MacroExpander::ExpandPlainBody(const LSMacroVariable& m, VarFrame* parentFrame,
@@ -140,17 +125,15 @@ bool MacroExpander::ExpandPlainBody(const LSMacroVariable& m, VarFrame* parentFr
     if (m.IsPython() || m.IsNaked() || m.GetReturnType() != LSV_Macro) return false;
     for (int64 i = 0; i < m.GetNumArgs(); ++i)
         if (m.GetArg(i).type != LSV_Macro || m.GetArg(i).isFnArg) return false;
-    const FileScopeVarFrame* bodyScope = parentFrame->GetFileScopeVarFrame();
-    auto dollarMacrosActive = [](const FileScopeVarFrame* scope) {
-        return scope && (!scope->dollarMacros.empty() || !scope->importedFiles.empty());
-    };
     ArgumentUse uses[kMaxPlainBodyUses];
     int64 count = 0;
-    if (!t_splits.Split(m, dollarMacrosActive(bodyScope), uses, count)) return false;
+    const bool bodyDollarMacrosActive = DollarMacrosActive(parentFrame);
+    if (!t_splits.Split(m, bodyDollarMacrosActive, uses, count)) return false;
 
     const BasicSubString body = m.GetSubstitutionString();
     const int64 bodyIndent = GetOutputPos();
-    const bool argDollarMacrosActive = count > 0 && dollarMacrosActive(frame->GetFileScopeVarFrame());
+    const bool argDollarMacrosActive =
+        count > 0 && (parentFrame == frame ? bodyDollarMacrosActive : DollarMacrosActive(frame));
     auto writeCopied = [&](BasicSubString s, int64 indent) {
         if (s.empty()) return;
         const int64 before = output->GetCharCount();

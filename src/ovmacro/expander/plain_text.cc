@@ -1,5 +1,6 @@
 #include "ovmacro/expander/plain_text.h"
 
+#include <algorithm>
 #include <array>
 #include <cstring>
 
@@ -11,6 +12,7 @@
 #include "ovmacro/lexer/char_classes.h"
 #include "ovmacro/lexer/token_scanner.h"
 #include "ovmacro/vars/name_filter.h"
+#include "ovmacro/vars/var_frame.h"
 
 namespace orvan {
 
@@ -202,6 +204,28 @@ PlainTextRun SkipPlainText(const char* p, const char* end, bool lineFeedsNeedWor
 PlainTextRun SkipPlainTextWithoutNames(const char* p, const char* end, bool lineFeedsNeedWork,
                                        bool dollarMacrosActive) {
     return SkipPlainTextIn(p, end, lineFeedsNeedWork, dollarMacrosActive, true);
+}
+
+bool DollarMacrosActive(const VarFrame* frame) {
+    const FileScopeVarFrame* scope = frame ? frame->GetFileScopeVarFrame() : nullptr;
+    return scope && (!scope->dollarMacros.empty() || !scope->importedFiles.empty());
+}
+
+bool IsOrdinaryTextIn(BasicSubString text, VarFrame* frame, bool dollarMacrosActive) {
+    // The commonest text, one word, is known from the filter of names (and a lookup when it may be one).
+    if (!text.empty() && IsIdentifierStart(text.front()) && !BeginsRawLiteral(text.begin(), text.end()) &&
+        std::all_of(text.begin() + 1, text.end(), IsIdentifierChar))
+        return !NameFilter::MayContain(text) || !frame->Find(text, text.end());
+    try {
+        for (const char* p = text.begin();;) {
+            const PlainTextRun run = SkipPlainText(p, text.end(), false, dollarMacrosActive);
+            if (run.stop == text.end()) return true;
+            if (!run.nameEnd || frame->Find(BasicSubString(run.stop, run.nameEnd), run.nameEnd)) return false;
+            p = run.nameEnd;
+        }
+    } catch (const LexScannerException&) {
+        return false;
+    }
 }
 
 }  // namespace orvan

@@ -22,4 +22,12 @@ PlainTextRun SkipPlainText(const char* p, const char* end, bool lineFeedsNeedWor
 PlainTextRun SkipPlainTextWithoutNames(const char* p, const char* end, bool lineFeedsNeedWork,
                                        bool dollarMacrosActive);
 
+class VarFrame;
+
+// Whether dollar macros can change a double-quoted literal in a text expanded in `frame`.
+bool DollarMacrosActive(const VarFrame* frame);
+// Whether `text` expands to itself in `frame`: ordinary text, and names that no variable there has. Whatever
+// would raise an error (a lookup, the scanner) makes it false, and the expansion reports it.
+bool IsOrdinaryTextIn(BasicSubString text, VarFrame* frame, bool dollarMacrosActive);
+
 }  // namespace orvan

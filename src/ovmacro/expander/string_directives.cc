@@ -6,6 +6,8 @@
 #include "ovmacro/expander/held_text.h"
 #include "ovmacro/expander/directive_text.h"
 #include "ovmacro/expander/macro_expander.h"
+#include "ovmacro/expander/nesting_guard.h"
+#include "ovmacro/expander/plain_text.h"
 #include "ovmacro/expr/expression_parser.h"
 #include "ovmacro/foundations/compose.h"
 #include "ovmacro/foundations/scanning.h"
@@ -51,18 +53,48 @@ void WriteSuffix(xostream& os, EStrLiteralMode /*mode*/) {
     os << '"';
 }
 
+// The text of a macro without arguments (a loop name, a constant) that is ordinary text where it expands: what
+// its expansion would be, found without expanding it; empty when the expansion is needed.
+BasicSubString OrdinaryValueOfName(LSVariable* v, VarFrame* frame) {
+    auto* m = dynamic_cast<LSMacroVariable*>(v);
+    if (!m || m->GetNumArgs() != 0 || m->IsPython() || m->IsNaked() || m->GetReturnType() != LSV_Macro) return {};
+    const BasicSubString body = m->GetSubstitutionString();
+    VarFrame* context = m->GetContext() ? m->GetContext() : frame;
+    if (body.empty() || std::find(body.begin(), body.end(), '\n') != body.end() ||
+        !IsOrdinaryTextIn(body, context, DollarMacrosActive(context)))
+        return {};
+    return body;
+}
+
 void MacroExpander::ProcessStrDirective(bool isX, EStrLiteralMode mode) {
     int64 indent = 0;
     const BasicSubString argument = ScanRndBrackettedString(cursor, indent);
     AdvanceWritePos(cursor.begin(), false);
-    const basic_xstring expanded = ExpandInChildFrame(frame, argument, indent);
+    // The commonest argument, one name whose value is ordinary text (a loop name over a list of display
+    // names), is taken as it stands: the same text, nesting levels and output count as its expansion.
+    BasicSubString expanded;
+    basic_xstring storage;
+    BasicSubString name = argument;
+    if (ScanIdentifier(name) && name.empty()) {
+        const BasicSubString word(argument.begin(), name.begin());
+        expanded = OrdinaryValueOfName(FindVariable(word), frame);
+        if (!expanded.empty()) {
+            const MacroNestingGuard argumentLevel(argument.begin()), bodyLevel(expanded.begin());
+            MacroNestingGuard::ChargeOutput(expanded.size(), expanded.begin());
+        }
+    }
+    if (expanded.empty()) {
+        storage = ExpandInChildFrame(frame, argument, indent);
+        expanded = BasicSubString(storage);
+    }
 
     const OutputIndentOverride lineUp(outputIndent, GetOutputPos());
     StringStream literal;
     WritePrefix(literal, mode);
     bool wroteLine = false;
-    for (const char c : expanded) {
-        if (isX && c == '\n') {
+    if (!isX) WriteTextForCStyleLiteralConstants(literal, expanded);
+    for (const char c : isX ? expanded.view() : std::string_view()) {
+        if (c == '\n') {
             // One literal per line: the line feed stays inside the literal as \n, and the next literal
             // starts on a new output line, lined up under the first.
             literal << "\\n";
