@@ -76,7 +76,8 @@ TEST(MpfwParser, DropsImportLinesOnRequest) {
         std::string folder;
     };
     dir.Write("a.ovm", "@def A = 1\n");
-    for (const auto& [keep, expected] : {std::pair{true, "x\n  @import \"a.ovm\"\n\n1\n"}, {false, "x\n1\n"}}) {
+    const std::pair<bool, std::string> cases[] = {{true, "x\n  @import \"a.ovm\"\n\n1\n"}, {false, "x\n1\n"}};
+    for (const auto& [keep, expected] : cases) {
         MpfwSourceFileList files;
         MpfwFrame frame(files);
         DiskHost host(frame);

@@ -25,15 +25,16 @@ constexpr const char* kSummary = "expand the macros of a text template";
 // The sections before the options.
 constexpr Section kDescription = {
     "DESCRIPTION", "",
-    "Expands the macros of FILE (standard input when FILE is - or absent) and writes the expansion to standard "
-    "output. Files that FILE imports with @import \"NAME\" are expanded in the same scope, so that their "
-    "definitions are visible after the @import, which leaves the expansion with its line (see --keep-imports)."};
+    "Expands the macros of FILE (standard input when FILE is - or absent) and writes the expansion to "
+    "standard output. Files that FILE imports with @import \"NAME\" are expanded in the same scope, so that "
+    "their definitions are visible after the @import, which leaves the expansion with its line (see "
+    "--keep-imports)."};
 
 // The sections after the options, in order.
 constexpr Section kSections[] = {
     {"THE LANGUAGE AT A GLANCE", nullptr,
-     "Ordinary text is copied with its layout; directives begin with @. A definition, a comment and the other "
-     "statement-like directives vanish with their line.\n"
+     "Ordinary text is copied with its layout; directives begin with @. A definition, a comment and the "
+     "other statement-like directives vanish with their line.\n"
      "\n"
      "    @def f(a, int b) = {body}    a macro; a type word makes a value\n"
      "                                 or an argument typed\n"
@@ -56,30 +57,30 @@ constexpr Section kSections[] = {
      "    @runpython{...}              Python 3 statements\n"
      "    @// comment, @@              a comment; nothing (ends a name)\n"
      "\n"
-     "Expressions have the types bool, int64, float64, char and string, with casts (int(x), string(x)...), type "
-     "tests (is_int(x)...), len, sin, cos, tan, exp, log, __FILE__ and __LINE__."},
+     "Expressions have the types bool, int64, float64, char and string, with casts (int(x), string(x)...), "
+     "type tests (is_int(x)...), len, sin, cos, tan, exp, log, __FILE__ and __LINE__."},
     {"OUTPUT FILES", "Output files",
-     "OUT, DEPFILE and MAPFILE are written only when every one of them can be: each is written to a temporary "
-     "file in its folder and renamed into place, so that a file is replaced whole or not at all, even by a "
-     "killed run or by runs that write it at the same time. A replaced file keeps its mode; other hard links to "
-     "it keep the old content. A symlink is followed and its target replaced. A device or a FIFO is written, "
-     "never replaced, and a file whose folder is not writable is rewritten in place. None of them may be FILE, "
-     "a file that FILE imports, or one of the others."},
+     "OUT, DEPFILE and MAPFILE are written only when every one of them can be: each is written to a "
+     "temporary file in its folder and renamed into place, so that a file is replaced whole or not at all, "
+     "even by a killed run or by runs that write it at the same time. A replaced file keeps its mode; other "
+     "hard links to it keep the old content. A symlink is followed and its target replaced. A device or a "
+     "FIFO is written, never replaced, and a file whose folder is not writable is rewritten in place. None "
+     "of them may be FILE, a file that FILE imports, or one of the others."},
     {"SOURCE MAPS", "Source maps",
      "A JSON object {\"version\": 1, \"output\": OUT or \"-\", \"files\": [the loaded files, in load order], "
-     "\"mappings\": [...]}, each mapping an object with \"offset\", \"length\", \"line\", \"column\", \"kind\" "
-     "and, when the run has a source, \"file\", \"sourceLine\", \"sourceColumn\" (and \"sourceLength\" for "
-     "calculated runs). The mappings tile the output in order; offset and length count bytes of the output, "
-     "line and column are where the run starts in it. kind is \"copied\" (the run is the text at file (an index "
-     "into files), sourceLine, sourceColumn), \"calculated\" (text that the sourceLength bytes there produced: a "
-     "macro value, a @str result...), \"indent\" (blanks that indent a nested text) or \"marker\" (a #line "
-     "line)."},
+     "\"mappings\": [...]}, each mapping an object with \"offset\", \"length\", \"line\", \"column\", "
+     "\"kind\" and, when the run has a source, \"file\", \"sourceLine\", \"sourceColumn\" (and "
+     "\"sourceLength\" for calculated runs). The mappings tile the output in order; offset and length count "
+     "bytes of the output, line and column are where the run starts in it. kind is \"copied\" (the run is "
+     "the text at file (an index into files), sourceLine, sourceColumn), \"calculated\" (text that the "
+     "sourceLength bytes there produced: a macro value, a @str result...), \"indent\" (blanks that indent a "
+     "nested text) or \"marker\" (a #line line)."},
     {"LINE MARKERS", "Line markers",
      "The template line of an output line is that of its first character, other than a blank or tab, that "
      "comes from a loaded file; lines without one (blank lines) never get a marker. A marker is written when "
      "the template file or line differs from the one the compiler presumes (that of the last marker plus the "
-     "output lines since), but never after a line ending in a backslash, in a /* */ comment or in a raw string "
-     "literal."},
+     "output lines since), but never after a line ending in a backslash, in a /* */ comment or in a raw "
+     "string literal."},
     {"DIAGNOSTICS", "Error reports",
      "An error is reported on standard error as FILE(LINE) : MESSAGE, after an empty line, followed by the "
      "context lines that it gathered on its way out: the macros it was invoked through, the directive it was "
@@ -95,9 +96,9 @@ constexpr Section kSections[] = {
      "        expression: 1 + x\n"
      "        passing formal argument n to macro twice\n"
      "\n"
-     "With --diagnostics=gnu the first line is FILE:LINE:COLUMN: error: MESSAGE, then come the source line and "
-     "a caret under the column, then the context lines; an error at a place in no file is reported as ovmacro: "
-     "error: MESSAGE. Lines and columns count from 1; a column counts bytes, so a tab counts 1.\n"
+     "With --diagnostics=gnu the first line is FILE:LINE:COLUMN: error: MESSAGE, then come the source line "
+     "and a caret under the column, then the context lines; an error at a place in no file is reported as "
+     "ovmacro: error: MESSAGE. Lines and columns count from 1; a column counts bytes, so a tab counts 1.\n"
      "\n"
      "    bad.ovm:2:11: error: Unexpected x after + in expression\n"
      "    twice(1 + x)\n"
@@ -108,8 +109,8 @@ constexpr Section kSections[] = {
      "A usage error is reported as ovmacro: MESSAGE, followed by Try 'ovmacro --help'."},
     {"EXIT STATUS", "Exit status",
      "0 on success; 1 when the expansion or the settings fail (the error is reported on standard error) or "
-     "--check finds OUT different or missing; 2 on a usage error, an unreadable FILE or an output that cannot "
-     "be written."},
+     "--check finds OUT different or missing; 2 on a usage error, an unreadable FILE or an output that "
+     "cannot be written."},
     {"EXAMPLES", nullptr,
      "Generate a header and a dependency file for the build, with a definition and an import folder:\n"
      "\n"
@@ -192,7 +193,8 @@ std::string OptionForms(const OptionSpec& spec, bool roff) {
     if (spec.shortName) forms = bold(dash + spec.shortName) + ", ";
     else if (!roff) forms = "    ";
     forms += bold(dash + dash + std::string(spec.longName));
-    if (spec.valueName) forms += "=" + (roff ? "\\fI" + std::string(spec.valueName) + "\\fR" : spec.valueName);
+    const std::string value = spec.valueName ? spec.valueName : "";
+    if (!value.empty()) forms += "=" + (roff ? "\\fI" + value + "\\fR" : value);
     return roff ? forms : "  " + forms;
 }
 
@@ -260,7 +262,8 @@ std::string ManualPage(const std::string& version) {
     out += ".SH SYNOPSIS\n.B ovmacro\n[\\fIOPTIONS\\fR] [\\fIFILE\\fR]\n";
     AppendManualSection(out, kDescription);
     out += ".SH OPTIONS\n";
-    for (const OptionSpec& spec : OptionTable()) out += ".TP\n" + OptionForms(spec, true) + "\n" + Roff(spec.help) + '\n';
+    for (const OptionSpec& spec : OptionTable())
+        out += ".TP\n" + OptionForms(spec, true) + "\n" + Roff(spec.help) + '\n';
     for (const Section& section : kSections) AppendManualSection(out, section);
     return out;
 }

@@ -65,8 +65,8 @@ bool OtherOutputPath(const char* option, const std::string& value, std::string& 
 // Rows in the order of --help; each names its option once, with its help text and what it records.
 constexpr OptionSpec kOptions[] = {
     {"output", 'o', "OUT",
-     "write the expansion to OUT instead, only when the expansion succeeds (- is standard output); see Output "
-     "files below",
+     "write the expansion to OUT instead, only when the expansion succeeds (- is standard output); see "
+     "Output files below",
      [](Options& o, const std::string& v, std::string& error) {
          if (v.empty()) error = "-o needs a file name (or - for standard output)";
          o.outputPath = v;
@@ -77,8 +77,8 @@ constexpr OptionSpec kOptions[] = {
      "FILE would; -D NAME defines NAME as true",
      [](Options& o, const std::string& v, std::string& error) { return ParseDefine(v, o, error); }},
     {"include-dir", 'I', "DIR",
-     "search imported files in DIR; an imported NAME is looked for beside the importing file, then in each -I "
-     "DIR in order, then in each @importpath directory",
+     "search imported files in DIR; an imported NAME is looked for beside the importing file, then in each "
+     "-I DIR in order, then in each @importpath directory",
      [](Options& o, const std::string& v, std::string& error) {
          if (v.empty()) error = "-I needs a directory";
          o.includeDirs.push_back(v);
@@ -109,8 +109,8 @@ constexpr OptionSpec kOptions[] = {
          return false;
      }},
     {"deps", 0, "DEPFILE",
-     "also write a Make dependency file: \"TARGET: FILE IMPORTED...\" (TARGET is OUT, else FILE) and an empty "
-     "rule for each imported file",
+     "also write a Make dependency file: \"TARGET: FILE IMPORTED...\" (TARGET is OUT, else FILE) and an "
+     "empty rule for each imported file",
      [](Options& o, const std::string& v, std::string& error) {
          return OtherOutputPath("--deps", v, o.depsPath, error);
      }},
@@ -126,8 +126,8 @@ constexpr OptionSpec kOptions[] = {
      "markers below)",
      [](Options& o, const std::string&, std::string&) { return o.lineMarkers = true; }},
     {"diagnostics", 0, "STYLE",
-     "the form of error reports: default (FILE(LINE) : MESSAGE) or gnu (FILE:LINE:COLUMN: error: MESSAGE, the "
-     "source line, a caret under the column, then the other lines of the message), which editors and CI "
+     "the form of error reports: default (FILE(LINE) : MESSAGE) or gnu (FILE:LINE:COLUMN: error: MESSAGE, "
+     "the source line, a caret under the column, then the other lines of the message), which editors and CI "
      "annotators read",
      [](Options& o, const std::string& v, std::string& error) {
          if (ParseDiagnosticStyle(v, o.diagnostics)) return true;
@@ -135,8 +135,8 @@ constexpr OptionSpec kOptions[] = {
          return false;
      }},
     {"check", 0, nullptr,
-     "with -o OUT: expand and compare with the existing OUT instead of writing it; exit 0 when equal, 1 with a "
-     "short unified diff when different or when OUT is missing; writes no file, so --deps and --source-map "
+     "with -o OUT: expand and compare with the existing OUT instead of writing it; exit 0 when equal, 1 with "
+     "a short unified diff when different or when OUT is missing; writes no file, so --deps and --source-map "
      "cannot be used with it",
      [](Options& o, const std::string&, std::string&) { return o.check = true; }},
     {"help", 'h', nullptr, "show this text and exit",
@@ -155,7 +155,8 @@ const OptionSpec* FindLongOption(std::string_view name, std::string& error) {
     }
     if (found.size() == 1) return found.front();
     error = (found.empty() ? "unknown option --" : "ambiguous option --") + std::string(name);
-    for (size_t i = 0; i < found.size(); ++i) error += (i ? ", --" : " (--") + std::string(found[i]->longName);
+    for (size_t i = 0; i < found.size(); ++i)
+        error += (i ? ", --" : " (--") + std::string(found[i]->longName);
     if (!found.empty()) error += ")";
     return nullptr;
 }
@@ -172,7 +173,8 @@ bool CheckCombinations(Options& options, std::string& error) {
         error = "--deps needs -o OUT when the input is standard input";
         return false;
     }
-    if (options.maxOutput == 0) options.maxOutput = options.restricted ? kRestrictedMaxOutput : kDefaultMaxOutput;
+    if (options.maxOutput == 0)
+        options.maxOutput = options.restricted ? kRestrictedMaxOutput : kDefaultMaxOutput;
     if (options.settings && options.outputPath == "-") {
         error = "-o - with --settings: the settings go to standard output";
         return false;
@@ -221,7 +223,8 @@ bool ParseOptions(int argc, char** argv, Options& options, std::string& error) {
             optionsEnded = true;
         } else if (arg.starts_with("--")) {
             const size_t eq = arg.find('=');
-            const OptionSpec* spec = FindLongOption(arg.substr(2, eq == std::string_view::npos ? eq : eq - 2), error);
+            const std::string_view name = arg.substr(2, eq == std::string_view::npos ? eq : eq - 2);
+            const OptionSpec* spec = FindLongOption(name, error);
             if (!spec) return false;
             const std::string option = std::string("--") + spec->longName;
             std::string value;
@@ -242,7 +245,7 @@ bool ParseOptions(int argc, char** argv, Options& options, std::string& error) {
                 const OptionSpec* spec = FindShortOption(arg[k]);
                 const std::string option = "-" + std::string(1, arg[k]);
                 if (!spec) {
-                    error = "unknown option " + (k == 1 ? std::string(arg) : option + " in " + std::string(arg));
+                    error = "unknown option " + (k == 1 ? "" : option + " in ") + std::string(arg);
                     return false;
                 }
                 std::string value;
