@@ -154,6 +154,8 @@ int Run(int argc, char** argv) {
     // The map from the expansion back to the sources serves the settings (their errors), line markers and
     // source maps; without them it is not kept.
     host.SetKeepOutputPieces(options.settings || options.lineMarkers || !options.sourceMapPath.empty());
+    // Generated code must not carry @import lines; the settings reader meets each import at its line.
+    host.SetKeepImportDirectives(options.settings || options.keepImports);
 
     if (!options.defines.empty() &&
         host.LoadText("<command line>", DefinitionsText(options)) != FileHost::Load::kOk)

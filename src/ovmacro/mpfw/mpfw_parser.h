@@ -58,6 +58,12 @@ public:
     // A host that only writes the expanded texts, and neither reads settings from them nor maps their
     // positions back, saves the pieces' memory: a few pieces for every macro call.
     void SetKeepOutputPieces(bool keep) { keepOutputPieces_ = keep; }
+    // Whether the expansions of the files loaded from now on keep their @import lines (they do by default).
+    // The reading steps meet an imported file's settings at its import, so a host that reads settings keeps
+    // them; a host that writes the expanded texts as generated code drops them, each with its line, as a @def
+    // line goes. The output pieces map what remains exactly.
+    void SetKeepImportDirectives(bool keep) { keepImportDirectives_ = keep; }
+    bool KeepsImportDirectives() const override { return keepImportDirectives_; }
     // From now on, the files loaded run under `restrictions`: an import or @importpath that would leave the
     // folders is refused with an error at the directive, before the file is read, and Python and the bounds
     // are set for the time of each load.
@@ -127,6 +133,7 @@ private:
 
     xvector<basic_xstring> expanding_;
     bool keepOutputPieces_ = true;
+    bool keepImportDirectives_ = true;
     bool restricted_ = false;
     MpfwRestrictions restrictions_;
 };
