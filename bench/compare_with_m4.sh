@@ -3,9 +3,12 @@
 # CPU times, the throughput, the peak resident memory and the speed-up of ovmacro over m4 (m4's time divided
 # by ovmacro's), all measured in this one run.
 #
-# Needs: GNU m4 and /usr/bin/time (scripts/install-deps.sh installs m4; this script installs nothing). It
-# builds ovmacro in Release into build/bench and writes its inputs and outputs into a temporary directory,
-# removed at the end. Usage: bench/compare_with_m4.sh   (RUNS=N sets the timed runs per tool, default 7)
+# Needs: GNU m4 and /usr/bin/time (scripts/install-deps.sh installs m4; this script installs nothing), and
+# gnuplot for the plot (scripts/setup.sh installs it; without it the plot is left out). It builds ovmacro in
+# Release into build/bench and writes its inputs and outputs into a temporary directory, removed at the end.
+# Usage: bench/compare_with_m4.sh   (RUNS=N sets the timed runs per tool, default 7; PLOT=FILE.svg where the
+# plot of time against input size goes, default bench/compare_with_m4.svg, which the README shows; PLOT_RUNS=N
+# the runs per point, default 3)
 #
 # Workloads (the two tools must produce byte-identical outputs, which is checked):
 #   plain text    40 MB of words, digits and punctuation without directives, which both tools copy unchanged
@@ -34,6 +37,7 @@ done
 
 echo "== building ovmacro (Release, build/bench)"
 source bench/common.sh
+source bench/plot.sh
 build_release_ovmacro
 
 work=$(mktemp -d "${TMPDIR:-/tmp}/ovmacro-vs-m4.XXXXXX")
@@ -186,3 +190,5 @@ echo
 echo "median of $runs alternating runs per tool; peak RSS is the largest of those runs; speed-up = m4 time / ovmacro"
 echo "time (wall and cpu = user + system); memory = ovmacro's peak RSS / its input's size;"
 echo "outputs of the two tools were identical for every workload; ovmacro $("$ovmacro" --version | awk '{ print $2 }'), $(m4 --version | head -n 1)"
+echo
+plot_time_against_size "${PLOT:-bench/compare_with_m4.svg}"

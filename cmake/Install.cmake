@@ -1,5 +1,6 @@
-# What `cmake --install` puts under the prefix: the shared library with its headers, the ovmacro tool, a CMake
-# package (find_package(ovMacroExpander) gives ovMacroExpander::ovMacroExpander) and a pkg-config file.
+# What `cmake --install` puts under the prefix: the shared library with its headers, the ovmacro tool and its
+# manual page, a CMake package (find_package(ovMacroExpander) gives ovMacroExpander::ovMacroExpander, the
+# executable ovMacroExpander::ovmacro and ovmacro_generate()) and a pkg-config file.
 # Everything is relocatable: `cmake --install build --prefix DIR` works for any DIR chosen at install time.
 include(GNUInstallDirs)
 include(CMakePackageConfigHelpers)
@@ -25,7 +26,8 @@ if(TARGET ovmacro)
   file(RELATIVE_PATH ovmacro_bin_to_lib
     ${CMAKE_INSTALL_FULL_BINDIR} ${CMAKE_INSTALL_FULL_LIBDIR})
   set_target_properties(ovmacro PROPERTIES INSTALL_RPATH "$ORIGIN/${ovmacro_bin_to_lib}")
-  install(TARGETS ovmacro RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR})
+  install(TARGETS ovmacro EXPORT ovMacroExpanderTargets RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR})
+  install(FILES ${OVMACRO_MANUAL_PAGE} DESTINATION ${CMAKE_INSTALL_MANDIR}/man1)
 endif()
 
 # The exported target carries the library, its include directory and the C++20 requirement, and nothing of
@@ -53,6 +55,7 @@ write_basic_package_version_file(
 install(FILES
   ${PROJECT_BINARY_DIR}/ovMacroExpanderConfig.cmake
   ${PROJECT_BINARY_DIR}/ovMacroExpanderConfigVersion.cmake
+  ${PROJECT_SOURCE_DIR}/cmake/ovMacroExpanderGenerate.cmake
   DESTINATION ${OVMACRO_CMAKE_DIR}
   COMPONENT Development)
 

@@ -7,7 +7,11 @@
 #     on its sample description, comparing the output with examples/host/project.expected, and on a faulty
 #     description, which must fail with a FILE(LINE) report;
 #   - builds the same host with the flags of `pkg-config --cflags --libs ovMacroExpander` (PKG_CONFIG_PATH)
-#     and runs it again.
+#     and runs it again;
+#   - builds examples/generate, which generates a header with ovmacro_generate() from a template importing a
+#     second file, with Make and with Ninja against the installed package, and with Ninja from the source tree
+#     (add_subdirectory); runs its program, then checks that touching or editing the imported file
+#     regenerates the header, and that a build without a change regenerates nothing.
 # Usage: scripts/check-install.sh [BUILD_DIR]
 set -euo pipefail
 cd "$(dirname "$0")/.."
@@ -28,6 +32,7 @@ if [ ! -f "$build/CMakeCache.txt" ]; then
   cmake -S . -B "$build" -DCMAKE_BUILD_TYPE=RelWithDebInfo -DOVMACRO_BUILD_TESTS=OFF -DOVMACRO_BUILD_BENCHMARKS=OFF
 fi
 cmake --build "$build" -j"$(nproc)" --target ovMacroExpander ovmacro
+command -v ninja >/dev/null || fail "ninja is needed (scripts/install-deps.sh installs it)"
 
 echo "== install into $prefix"
 cmake --install "$build" --prefix "$prefix" >"$work/install.log"
@@ -37,7 +42,8 @@ libdir=$(dirname "$(find "$prefix" -name 'libovMacroExpander.so' -print -quit)")
 [ -d "$libdir" ] || fail "libovMacroExpander.so was not installed"
 for f in "$prefix/include/ovmacro/ovMacroExpander.h" "$prefix/include/ovmacro/mpfw/mpfw_parser.h" \
   "$libdir/libovMacroExpander.so.$version" "$libdir/cmake/ovMacroExpander/ovMacroExpanderConfig.cmake" \
-  "$libdir/cmake/ovMacroExpander/ovMacroExpanderConfigVersion.cmake" "$libdir/pkgconfig/ovMacroExpander.pc"; do
+  "$libdir/cmake/ovMacroExpander/ovMacroExpanderConfigVersion.cmake" "$libdir/pkgconfig/ovMacroExpander.pc" \
+  "$libdir/cmake/ovMacroExpander/ovMacroExpanderGenerate.cmake" "$prefix/share/man/man1/ovmacro.1"; do
   [ -e "$f" ] || fail "missing after install: ${f#"$prefix"/}"
 done
 # A consumer needs only the library and its headers: nothing installed may ask for Python's development files.
@@ -94,5 +100,43 @@ echo "pkg-config --cflags --libs: $flags"
 "${CXX:-c++}" -std=c++20 -Wall -Wextra -Wpedantic -Werror -o "$work/host-pc" examples/host/host.cc $flags \
   -Wl,-rpath,"$libdir"
 check_host "pkg-config" "$work/host-pc"
+
+# check_generate LABEL CMAKE_ARGUMENTS...: builds a copy of examples/generate, then edits its imported file.
+check_generate() {
+  local label=$1
+  shift
+  local src=$work/generate-$label build=$work/generate-$label/build
+  cp -r examples/generate "$src"
+  cmake -S "$src" -B "$build" -DCMAKE_CXX_FLAGS=-Werror "$@" >"$work/generate.log" 2>&1 ||
+    { cat "$work/generate.log"; fail "$label: configuring examples/generate failed"; }
+  build_generate() {
+    cmake --build "$build" -j"$(nproc)" >"$work/generate.log" 2>&1 ||
+      { cat "$work/generate.log"; fail "$label: building examples/generate failed"; }
+  }
+  local header=$build/colors.h out before
+  build_generate
+  out=$("$build/palette")
+  [ "$out" = "release: red green blue" ] || fail "$label: the program printed '$out'"
+
+  before=$(date -r "$header" +%s.%N)
+  touch "$src/common/palette.ovm"
+  build_generate
+  [ "$(date -r "$header" +%s.%N)" != "$before" ] || fail "$label: touching the imported file did not regenerate"
+  echo '@def COLORS = [cyan, magenta]' >"$src/common/palette.ovm"
+  build_generate
+  out=$("$build/palette")
+  [ "$out" = "release: cyan magenta" ] || fail "$label: after editing the imported file the program printed '$out'"
+
+  before=$(date -r "$header" +%s.%N)
+  build_generate
+  [ "$(date -r "$header" +%s.%N)" = "$before" ] || fail "$label: a build without a change regenerated the header"
+  ! grep -q 'Generating colors.h' "$work/generate.log" || fail "$label: a build without a change ran ovmacro"
+  echo "$label: ok"
+}
+
+echo "== examples/generate with ovmacro_generate()"
+check_generate make -G "Unix Makefiles" -DCMAKE_PREFIX_PATH="$prefix"
+check_generate ninja -G Ninja -DCMAKE_PREFIX_PATH="$prefix"
+check_generate source-tree -G Ninja -DOVMACRO_SOURCE_DIR="$root"
 
 echo "install check passed"

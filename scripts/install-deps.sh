@@ -1,8 +1,10 @@
 #!/usr/bin/env bash
-# Installs the Debian packages the project needs, if any is missing (Debian 12). Needs root or sudo.
+# Installs the Debian packages the project needs, if any is missing (Debian 12), and any package named as an
+# argument (scripts/setup.sh adds gnuplot-nox, for the benchmark's plot). Needs root or sudo.
+# ninja-build and man-db serve the install check and the manual page's test.
 set -euo pipefail
 
-packages=(cmake make g++ libgtest-dev libbenchmark-dev libpython3-dev pkg-config m4)
+packages=(cmake make ninja-build g++ libgtest-dev libbenchmark-dev libpython3-dev pkg-config m4 man-db "$@")
 missing=()
 for p in "${packages[@]}"; do
   dpkg-query -W -f='${Status}' "$p" 2>/dev/null | grep -q 'install ok installed' || missing+=("$p")

@@ -226,7 +226,7 @@ TEST(Restricted, SymlinksOutOfThePermittedFoldersAreRefused) {
     EXPECT_EQ(r.exitCode, 1);
     EXPECT_EQ(r.err, "\nt.ovm(1) : Import of link.ovm refused: it lies outside the folders allowed in restricted mode\n");
     r = RunTool({"--restricted", "u.ovm"}, "", dir.path() / "in");
-    EXPECT_EQ(r.out, "@import \"inside/ok.ovm\"\nfine\n") << "a link that stays inside is fine";
+    EXPECT_EQ(r.out, "fine\n") << "a link that stays inside is fine";
 }
 
 // Deep nesting ends in the nesting error, and long contexts are shortened: the report stays small.

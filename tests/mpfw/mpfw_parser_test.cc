@@ -64,5 +64,35 @@ TEST(MpfwParser, ReadingSteps) {
     EXPECT_EQ(::testing::internal::GetCapturedStderr(), "\n" + dir.path().string() + "/g(2) : bad\n");
 }
 
+// A host that writes generated code drops the import lines; what remains still maps back to its source.
+TEST(MpfwParser, DropsImportLinesOnRequest) {
+    const testing::TempDir dir;
+    struct DiskHost : Host {
+        using Host::Host;
+        bool ResolveFile(const basic_xstring& name, basic_xstring& fullPath) override {
+            fullPath = folder + "/" + name;
+            return true;
+        }
+        std::string folder;
+    };
+    dir.Write("a.ovm", "@def A = 1\n");
+    const std::pair<bool, std::string> cases[] = {{true, "x\n  @import \"a.ovm\"\n\n1\n"}, {false, "x\n1\n"}};
+    for (const auto& [keep, expected] : cases) {
+        MpfwSourceFileList files;
+        MpfwFrame frame(files);
+        DiskHost host(frame);
+        host.folder = dir.path().string();
+        host.SetKeepImportDirectives(keep);
+        const MpfwSourceFile* f = host.AddFileWithText("t", "x\n  @import \"a.ovm\"\n\nA\n");
+        ASSERT_NE(f, nullptr);
+        EXPECT_EQ(f->expandedText, expected);
+        ASSERT_EQ(f->pieces.size(), static_cast<int64>(f->expandedText.size()));
+        const MpfwSourceFile* a = files[1];  // the body of A, copied
+        const auto one = static_cast<int64>(f->expandedText.find('1'));
+        EXPECT_EQ(f->pieces.MapOutputPositionToAddress(one), a->text.data() + a->text.find('1'));
+        EXPECT_EQ(f->pieces.MapOutputPositionToAddress(one + 1), f->text.data() + f->text.size() - 1);
+    }
+}
+
 }  // namespace
 }  // namespace orvan

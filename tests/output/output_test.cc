@@ -1,4 +1,5 @@
-// The expanded output and its pieces: indentation, columns, gathered short runs, positions mapped back.
+// The expanded output and its pieces: indentation, columns, gathered short runs, positions mapped back; the
+// source files that positions belong to.
 #include <gtest/gtest.h>
 
 #include <algorithm>
@@ -10,6 +11,7 @@
 #include <vector>
 
 #include "ovmacro/output/expanded_output.h"
+#include "ovmacro/output/source_files.h"
 
 namespace orvan {
 namespace {
@@ -113,6 +115,33 @@ TEST(OutputPiecesDeathTest, PositionsOutsideTheOutputAbort) {
     OutputPieces pieces;
     pieces.push_back(OutputPiece(BasicSubString("abc"), 0));
     EXPECT_DEATH(pieces.MapOutputPositionToAddress(-1), "output position -1 outside the output \\[0,3\\)");
+}
+
+// A position is looked up in the files in load order; null and another buffer belong to none.
+TEST(SourceFileList, PositionsBelongToTheFileThatHoldsThem) {
+    MpfwSourceFileList files;
+    for (const char* text : {"a\nb", "x\ny\nz"}) {
+        auto* f = new MpfwSourceFile;
+        f->fileName = text[0] == 'a' ? "base.cfg" : "other.cfg";
+        f->text = text;
+        files.AddSrcFile(f);
+    }
+    const basic_xstring& other = files[1]->text;
+    const std::tuple<const char*, int64, const char*, int64> cases[] = {
+        {other.data() + 4, 1, "other.cfg", 3},
+        {files[0]->text.data(), 0, "base.cfg", 1},
+        {other.data() + other.size(), -1, "other.cfg", 3},  // an error at the end is on the last line
+        {"elsewhere", -1, nullptr, 0},
+        {nullptr, -1, nullptr, 0},
+    };
+    for (const auto& [pos, index, name, line] : cases) {
+        basic_xstring foundName = "none";
+        int64 foundLine = 0;
+        EXPECT_EQ(files.GetSrcFileIndexContainingPosition(pos), index);
+        EXPECT_EQ(files.GetFilenameAndLineNumber(pos, foundName, foundLine), name != nullptr);
+        EXPECT_EQ(foundName, name ? name : "none");
+        EXPECT_EQ(foundLine, line);
+    }
 }
 
 }  // namespace

@@ -25,9 +25,12 @@ void Reset() {
 // of the error raised at kPos ("!elsewhere " when raised at another place).
 std::string Python(const std::string& code) {
     try {
-        basic_xstring result;
-        if (code.rfind("run:", 0) == 0) RunPython("", code.substr(4), kPos);
-        if (code.rfind("run:", 0) != 0) EvalPythonExpression(code, result, kPos);
+        if (code.rfind("run:", 0) == 0) {
+            RunPython("", code.substr(4), kPos);
+            return "";
+        }
+        basic_xstring result = "stale";  // the value replaces it
+        EvalPythonExpression(code, result, kPos);
         return result;
     } catch (const LexScannerException& e) {
         return (e.GetPosition() == kPos ? "! " : "!elsewhere ") + std::string(e.GetMessage());

@@ -159,6 +159,8 @@ int Run(int argc, char** argv) {
     host.SetKeepOutputPieces(options.settings || options.lineMarkers || !options.sourceMapPath.empty());
     host.SetMapLargeFiles(true);
     ovmacro_tool::EndRunWhenAMappedInputShrinks();
+    // Generated code must not carry @import lines; the settings reader meets each import at its line.
+    host.SetKeepImportDirectives(options.settings || options.keepImports);
 
     if (!options.defines.empty() &&
         host.LoadText("<command line>", DefinitionsText(options)) != FileHost::Load::kOk)

@@ -1,8 +1,10 @@
+// The options of ovmacro: their table, and the parser of their GNU forms.
 #include "options.h"
 
 #include <limits>
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "ovmacro/foundations/scanning.h"
 
@@ -49,196 +51,130 @@ bool ParseSize(const std::string& text, long long& size) {
     return true;
 }
 
-}  // namespace
-
-const char* UsageText() {
-    return "Usage: ovmacro [OPTIONS] [FILE]\n"
-           "Expands the macros of FILE (standard input when FILE is - or absent) and writes the\n"
-           "expansion to standard output. Files that FILE imports with @import \"NAME\" are expanded\n"
-           "in the same scope, so that their definitions are visible after the @import, which\n"
-           "stays in the output.\n"
-           "\n"
-           "Options:\n"
-           "  -o OUT         write the expansion to OUT instead, only when the expansion succeeds\n"
-           "                 (- is standard output); see Output files below\n"
-           "  -D NAME=TEXT   define macro NAME with body TEXT before FILE is expanded, as a line\n"
-           "                 \"@def NAME = TEXT\" at the top of FILE would; -D NAME defines NAME as\n"
-           "                 true\n"
-           "  -I DIR         search imported files in DIR; an imported NAME is looked for beside\n"
-           "                 the importing file, then in each -I DIR in order, then in each\n"
-           "                 @importpath directory\n"
-           "  --settings     after expanding, read the settings of FILE and its imports and print\n"
-           "                 each dollar definition ($NAME = value) as NAME=VALUE; the expansion\n"
-           "                 goes only to -o OUT\n"
-           "  --no-python    refuse embedded Python code (@runpython, @defpython macros fail)\n"
-           "  --restricted   for templates you did not write: no embedded Python; imports only\n"
-           "                 from FILE's folder (the working directory for standard input) and\n"
-           "                 the -I folders, by relative names that do not lead out of them, also\n"
-           "                 through symlinks; --max-output defaults to 64M, and an expansion stops\n"
-           "                 after 4 million steps (macro calls, blocks, loop iterations)\n"
-           "  --max-output SIZE\n"
-           "                 stop with an error when an expansion has written more than SIZE\n"
-           "                 bytes, the text made inside directives included (a suffix K, M or G\n"
-           "                 multiplies by 1024, 1024^2, 1024^3); 2G by default\n"
-           "  --deps DEPFILE also write a Make dependency file: \"TARGET: FILE IMPORTED...\" (TARGET\n"
-           "                 is OUT, else FILE) and an empty rule for each imported file\n"
-           "  --source-map MAPFILE\n"
-           "                 also write a JSON source map of the expansion: for each run of output\n"
-           "                 (never more than one line), the file, line and column it was copied\n"
-           "                 from or that produced it (see below)\n"
-           "  --line-markers write a line #line N \"FILE\" before each output line whose template\n"
-           "                 line is not the one a C or C++ compiler would count on, so that its\n"
-           "                 errors in the generated code name the template line (see below)\n"
-           "  --diagnostics=STYLE\n"
-           "                 the form of error reports: default (FILE(LINE) : MESSAGE) or gnu\n"
-           "                 (FILE:LINE:COLUMN: error: MESSAGE, the source line, a caret under the\n"
-           "                 column, then the other lines of the message), which editors and CI\n"
-           "                 annotators read\n"
-           "  --check        with -o OUT: expand and compare with the existing OUT instead of\n"
-           "                 writing it; exit 0 when equal, 1 with a short unified diff when\n"
-           "                 different or when OUT is missing; writes no file, so --deps and\n"
-           "                 --source-map cannot be used with it\n"
-           "  --help         show this text and exit\n"
-           "  --version      show the version and exit\n"
-           "\n"
-           "Lines and columns count from 1; a column counts bytes, so a tab counts 1.\n"
-           "\n"
-           "Source map: a JSON object {\"version\": 1, \"output\": OUT or \"-\", \"files\": [the loaded\n"
-           "files, in load order], \"mappings\": [...]}, each mapping an object with \"offset\",\n"
-           "\"length\", \"line\", \"column\", \"kind\" and, when the run has a source, \"file\",\n"
-           "\"sourceLine\", \"sourceColumn\" (and \"sourceLength\" for calculated runs). The mappings\n"
-           "tile the output in order; offset and length count bytes of the output, line and column\n"
-           "are where the run starts in it. kind is \"copied\" (the run is the text at file (an\n"
-           "index into files), sourceLine, sourceColumn), \"calculated\" (text that the sourceLength\n"
-           "bytes there produced: a macro value, a @str result...), \"indent\" (blanks that indent a\n"
-           "nested text) or \"marker\" (a #line line).\n"
-           "\n"
-           "Line markers: the template line of an output line is that of its first character,\n"
-           "other than a blank or tab, that comes from a loaded file; lines without one (blank\n"
-           "lines) never get a marker. A marker is written when the template file or line differs\n"
-           "from the one the compiler presumes (that of the last marker plus the output lines\n"
-           "since), but never after a line ending in a backslash, in a /* */ comment or in a raw\n"
-           "string literal.\n"
-           "\n"
-           "Output files: OUT, DEPFILE and MAPFILE are written only when every one of them can\n"
-           "be: each is written to a temporary file in its folder and renamed into place, so\n"
-           "that a file is replaced whole or not at all, even by a killed run or by runs that\n"
-           "write it at the same time. A replaced file keeps its mode; other hard links to it\n"
-           "keep the old content. A symlink is followed and its target replaced. A device or a\n"
-           "FIFO is written, never replaced, and a file whose folder is not writable is\n"
-           "rewritten in place. None of them may be FILE, a file that FILE imports, or one of\n"
-           "the others.\n"
-           "\n"
-           "Exit status: 0 on success, 1 when the expansion or the settings fail (the error is\n"
-           "reported on standard error) or --check finds OUT different or missing, 2 on a usage\n"
-           "error, an unreadable FILE or an output that cannot be written.\n";
+// A file name for an output that the expansion does not go to: "-" would be a file of that name, not
+// standard output, which holds the expansion.
+bool OtherOutputPath(const char* option, const std::string& value, std::string& path, std::string& error) {
+    if (value.empty() || value == "-") {
+        error = std::string(option) + " needs a file name";
+        return false;
+    }
+    path = value;
+    return true;
 }
 
-bool ParseOptions(int argc, char** argv, Options& options, std::string& error) {
-    bool haveInput = false;
-    for (int i = 1; i < argc; ++i) {
-        const std::string_view arg = argv[i];
-        auto value = [&](std::string& out) {
-            if (i + 1 >= argc) {
-                error = "option " + std::string(arg) + " needs a value";
-                return false;
-            }
-            out = argv[++i];
-            return true;
-        };
-        // "-X VALUE" or "-XVALUE" for the short options that take a value.
-        auto shortValue = [&](std::string& out) {
-            if (arg.size() > 2) {
-                out = std::string(arg.substr(2));
-                return true;
-            }
-            return value(out);
-        };
-        std::string text;
-        if (arg == "--help" || arg == "-h") {
-            options.help = true;
-        } else if (arg == "--version") {
-            options.version = true;
-        } else if (arg == "--settings") {
-            options.settings = true;
-        } else if (arg == "--no-python") {
-            options.noPython = true;
-        } else if (arg == "--line-markers") {
-            options.lineMarkers = true;
-        } else if (arg == "--check") {
-            options.check = true;
-        } else if (arg == "--source-map" || arg.substr(0, 13) == "--source-map=") {
-            if (arg.size() > 12)
-                options.sourceMapPath = std::string(arg.substr(13));
-            else if (!value(options.sourceMapPath))
-                return false;
-            // "-" would be a file of that name, not standard output, which holds the expansion.
-            if (options.sourceMapPath.empty() || options.sourceMapPath == "-") {
-                error = "--source-map needs a file name";
-                return false;
-            }
-        } else if (arg == "--diagnostics" || arg.substr(0, 14) == "--diagnostics=") {
-            if (arg.size() > 13)
-                text = std::string(arg.substr(14));
-            else if (!value(text))
-                return false;
-            if (!ParseDiagnosticStyle(text, options.diagnostics)) {
-                error = "unknown diagnostics style '" + text + "' (expected default or gnu)";
-                return false;
-            }
-        } else if (arg == "--deps" || arg.substr(0, 7) == "--deps=") {
-            if (arg.size() > 6)
-                options.depsPath = std::string(arg.substr(7));
-            else if (!value(options.depsPath))
-                return false;
-            // "-" would be a file of that name, not standard output, which holds the expansion.
-            if (options.depsPath.empty() || options.depsPath == "-") {
-                error = "--deps needs a file name";
-                return false;
-            }
-        } else if (arg == "--restricted") {
-            options.restricted = true;
-        } else if (arg == "--max-output" || arg.substr(0, 13) == "--max-output=") {
-            if (arg.size() > 12)
-                text = std::string(arg.substr(13));
-            else if (!value(text))
-                return false;
-            if (!ParseSize(text, options.maxOutput)) {
-                error = "--max-output needs a size in bytes, with an optional K, M or G: " + text;
-                return false;
-            }
-        } else if (arg.substr(0, 2) == "-o") {
-            if (!shortValue(options.outputPath)) return false;
-            if (options.outputPath.empty()) {
-                error = "-o needs a file name (or - for standard output)";
-                return false;
-            }
-        } else if (arg.substr(0, 2) == "-D") {
-            if (!shortValue(text) || !ParseDefine(text, options, error)) return false;
-        } else if (arg.substr(0, 2) == "-I") {
-            if (!shortValue(text)) return false;
-            if (text.empty()) {
-                error = "-I needs a directory";
-                return false;
-            }
-            options.includeDirs.push_back(text);
-        } else if (arg.size() > 1 && arg[0] == '-') {
-            error = "unknown option " + std::string(arg);
-            return false;
-        } else {
-            if (haveInput) {
-                error = "more than one input file given";
-                return false;
-            }
-            options.inputPath = std::string(arg);
-            haveInput = true;
-        }
+// Rows in the order of --help; each names its option once, with its help text and what it records.
+constexpr OptionSpec kOptions[] = {
+    {"output", 'o', "OUT",
+     "write the expansion to OUT instead, only when the expansion succeeds (- is standard output); see "
+     "Output files below",
+     [](Options& o, const std::string& v, std::string& error) {
+         if (v.empty()) error = "-o needs a file name (or - for standard output)";
+         o.outputPath = v;
+         return !v.empty();
+     }},
+    {"define", 'D', "NAME=TEXT",
+     "define macro NAME with body TEXT before FILE is expanded, as a line \"@def NAME = TEXT\" at the top of "
+     "FILE would; -D NAME defines NAME as true",
+     [](Options& o, const std::string& v, std::string& error) { return ParseDefine(v, o, error); }},
+    {"include-dir", 'I', "DIR",
+     "search imported files in DIR; an imported NAME is looked for beside the importing file, then in each "
+     "-I DIR in order, then in each @importpath directory",
+     [](Options& o, const std::string& v, std::string& error) {
+         if (v.empty()) error = "-I needs a directory";
+         o.includeDirs.push_back(v);
+         return !v.empty();
+     }},
+    {"keep-imports", 0, nullptr,
+     "keep the @import lines in the expansion; without it each @import and @importpath directive leaves the "
+     "expansion with its line, as a @def line does, so that generated code does not carry them",
+     [](Options& o, const std::string&, std::string&) { return o.keepImports = true; }},
+    {"settings", 0, nullptr,
+     "after expanding, read the settings of FILE and its imports and print each dollar definition ($NAME = "
+     "value) as NAME=VALUE; the expansion, its @import lines kept, goes only to -o OUT",
+     [](Options& o, const std::string&, std::string&) { return o.settings = true; }},
+    {"no-python", 0, nullptr, "refuse embedded Python code (@runpython, @defpython macros fail)",
+     [](Options& o, const std::string&, std::string&) { return o.noPython = true; }},
+    {"restricted", 0, nullptr,
+     "for templates you did not write: no embedded Python; imports only from FILE's folder (the working "
+     "directory for standard input) and the -I folders, by relative names that do not lead out of them, also "
+     "through symlinks; --max-output defaults to 64M, and an expansion stops after 4 million steps (macro "
+     "calls, blocks, loop iterations)",
+     [](Options& o, const std::string&, std::string&) { return o.restricted = true; }},
+    {"max-output", 0, "SIZE",
+     "stop with an error when an expansion has written more than SIZE bytes, the text made inside directives "
+     "included (a suffix K, M or G multiplies by 1024, 1024^2, 1024^3); 2G by default",
+     [](Options& o, const std::string& v, std::string& error) {
+         if (ParseSize(v, o.maxOutput)) return true;
+         error = "--max-output needs a size in bytes, with an optional K, M or G: " + v;
+         return false;
+     }},
+    {"deps", 0, "DEPFILE",
+     "also write a Make dependency file: \"TARGET: FILE IMPORTED...\" (TARGET is OUT, else FILE) and an "
+     "empty rule for each imported file",
+     [](Options& o, const std::string& v, std::string& error) {
+         return OtherOutputPath("--deps", v, o.depsPath, error);
+     }},
+    {"source-map", 0, "MAPFILE",
+     "also write a JSON source map of the expansion: for each run of output (never more than one line), the "
+     "file, line and column it was copied from or that produced it (see Source maps below)",
+     [](Options& o, const std::string& v, std::string& error) {
+         return OtherOutputPath("--source-map", v, o.sourceMapPath, error);
+     }},
+    {"line-markers", 0, nullptr,
+     "write a line #line N \"FILE\" before each output line whose template line is not the one a C or C++ "
+     "compiler would count on, so that its errors in the generated code name the template line (see Line "
+     "markers below)",
+     [](Options& o, const std::string&, std::string&) { return o.lineMarkers = true; }},
+    {"diagnostics", 0, "STYLE",
+     "the form of error reports: default (FILE(LINE) : MESSAGE) or gnu (FILE:LINE:COLUMN: error: MESSAGE, "
+     "the source line, a caret under the column, then the other lines of the message), which editors and CI "
+     "annotators read",
+     [](Options& o, const std::string& v, std::string& error) {
+         if (ParseDiagnosticStyle(v, o.diagnostics)) return true;
+         error = "unknown diagnostics style '" + v + "' (expected default or gnu)";
+         return false;
+     }},
+    {"check", 0, nullptr,
+     "with -o OUT: expand and compare with the existing OUT instead of writing it; exit 0 when equal, 1 with "
+     "a short unified diff when different or when OUT is missing; writes no file, so --deps and --source-map "
+     "cannot be used with it",
+     [](Options& o, const std::string&, std::string&) { return o.check = true; }},
+    {"help", 'h', nullptr, "show this text and exit",
+     [](Options& o, const std::string&, std::string&) { return o.help = true; }},
+    {"version", 0, nullptr, "show the version and exit",
+     [](Options& o, const std::string&, std::string&) { return o.version = true; }},
+};
+
+// The option of a long name, or of the one long name that it begins (as GNU tools accept); null, with error
+// set, when none or several match.
+const OptionSpec* FindLongOption(std::string_view name, std::string& error) {
+    std::vector<const OptionSpec*> found;
+    for (const OptionSpec& spec : kOptions) {
+        if (name == spec.longName) return &spec;
+        if (!name.empty() && std::string_view(spec.longName).starts_with(name)) found.push_back(&spec);
     }
+    if (found.size() == 1) return found.front();
+    error = (found.empty() ? "unknown option --" : "ambiguous option --") + std::string(name);
+    for (size_t i = 0; i < found.size(); ++i)
+        error += (i ? ", --" : " (--") + std::string(found[i]->longName);
+    if (!found.empty()) error += ")";
+    return nullptr;
+}
+
+const OptionSpec* FindShortOption(char name) {
+    for (const OptionSpec& spec : kOptions)
+        if (spec.shortName == name) return &spec;
+    return nullptr;
+}
+
+// The checks that concern several options together, once all are read.
+bool CheckCombinations(Options& options, std::string& error) {
     if (!options.depsPath.empty() && options.inputPath == "-" && options.outputPath.empty()) {
         error = "--deps needs -o OUT when the input is standard input";
         return false;
     }
-    if (options.maxOutput == 0) options.maxOutput = options.restricted ? kRestrictedMaxOutput : kDefaultMaxOutput;
+    if (options.maxOutput == 0)
+        options.maxOutput = options.restricted ? kRestrictedMaxOutput : kDefaultMaxOutput;
     if (options.settings && options.outputPath == "-") {
         error = "-o - with --settings: the settings go to standard output";
         return false;
@@ -256,6 +192,74 @@ bool ParseOptions(int argc, char** argv, Options& options, std::string& error) {
         return false;
     }
     return true;
+}
+
+}  // namespace
+
+std::span<const OptionSpec> OptionTable() { return kOptions; }
+
+bool ParseOptions(int argc, char** argv, Options& options, std::string& error) {
+    bool haveInput = false;
+    bool optionsEnded = false;
+    for (int i = 1; i < argc; ++i) {
+        const std::string_view arg = argv[i];
+        // The value of an option that ends its argument is the next argument, whatever it looks like.
+        auto nextValue = [&](const std::string& option, std::string& value) {
+            if (i + 1 >= argc) {
+                error = "option " + option + " needs a value";
+                return false;
+            }
+            value = argv[++i];
+            return true;
+        };
+        if (optionsEnded || arg.size() < 2 || arg[0] != '-') {  // FILE ("-" is standard input)
+            if (haveInput) {
+                error = "more than one input file given";
+                return false;
+            }
+            options.inputPath = std::string(arg);
+            haveInput = true;
+        } else if (arg == "--") {
+            optionsEnded = true;
+        } else if (arg.starts_with("--")) {
+            const size_t eq = arg.find('=');
+            const std::string_view name = arg.substr(2, eq == std::string_view::npos ? eq : eq - 2);
+            const OptionSpec* spec = FindLongOption(name, error);
+            if (!spec) return false;
+            const std::string option = std::string("--") + spec->longName;
+            std::string value;
+            if (eq != std::string_view::npos) {
+                if (!spec->valueName) {
+                    error = "option " + option + " takes no value";
+                    return false;
+                }
+                value = std::string(arg.substr(eq + 1));
+            } else if (spec->valueName && !nextValue(option, value)) {
+                return false;
+            }
+            if (!spec->apply(options, value, error)) return false;
+        } else {
+            // Short options, grouped: those without a value, then at most one with a value, which is the
+            // rest of the argument or else the next argument.
+            for (size_t k = 1; k < arg.size(); ++k) {
+                const OptionSpec* spec = FindShortOption(arg[k]);
+                const std::string option = "-" + std::string(1, arg[k]);
+                if (!spec) {
+                    error = "unknown option " + (k == 1 ? "" : option + " in ") + std::string(arg);
+                    return false;
+                }
+                std::string value;
+                const bool takesValue = spec->valueName != nullptr;
+                if (takesValue && k + 1 < arg.size())
+                    value = std::string(arg.substr(k + 1));
+                else if (takesValue && !nextValue(option, value))
+                    return false;
+                if (!spec->apply(options, value, error)) return false;
+                if (takesValue) break;
+            }
+        }
+    }
+    return CheckCombinations(options, error);
 }
 
 }  // namespace ovmacro_tool

@@ -1,6 +1,7 @@
 // Command-line options of the ovmacro tool.
 #pragma once
 
+#include <span>
 #include <string>
 #include <utility>
 #include <vector>
@@ -17,6 +18,7 @@ struct Options {
     std::vector<std::pair<std::string, std::string>> defines;  // -D NAME=TEXT, in order
     std::vector<std::string> includeDirs;                      // -I DIR, in order
     bool settings = false;     // --settings: print the settings instead of the expansion
+    bool keepImports = false;  // --keep-imports: the @import lines stay in the expansion
     bool noPython = false;     // --no-python: refuse embedded Python code
     bool lineMarkers = false;  // --line-markers: write #line markers into the expansion
     bool check = false;        // --check: compare the expansion with OUT instead of writing it
@@ -31,9 +33,26 @@ struct Options {
 inline constexpr long long kDefaultMaxOutput = 2LL << 30;
 inline constexpr long long kRestrictedMaxOutput = 64LL << 20;
 
-// Parses argv; on a usage error returns false and sets `error`.
+// One option: its names, whether it takes a value, its help text and what it records. The table of them is
+// the one place that lists the options: the parser, --help and the manual page all read it.
+struct OptionSpec {
+    const char* longName;   // "output" for --output
+    char shortName;         // 'o' for -o; 0 for none
+    const char* valueName;  // the value as --help names it ("OUT"); null for an option without a value
+    const char* help;       // one paragraph, which --help and the manual page wrap
+    // Records the option and its value (empty for an option without one); false, with error set, on a bad
+    // value.
+    bool (*apply)(Options& options, const std::string& value, std::string& error);
+};
+
+// Every option, in the order --help lists them.
+std::span<const OptionSpec> OptionTable();
+
+// Parses argv in the GNU forms: "-o OUT" or "-oOUT"; "--output OUT" or "--output=OUT", or an unambiguous
+// beginning of the long name; short options without a value grouped ("-hX..."); "--" ends the options, and
+// options and FILE may come in any order. On a usage error returns false and sets `error`.
 bool ParseOptions(int argc, char** argv, Options& options, std::string& error);
-// The text of --help.
+// The text of --help, made from the option table and the manual's sections (manual.cc).
 const char* UsageText();
 
 }  // namespace ovmacro_tool

@@ -13,14 +13,17 @@ namespace orvan {
 void MacroExpander::ProcessImportDirective() {
     const LSToken token = ReadToken();
     const char* position = token.text.begin();
+    const bool keep = importHandler->KeepsImportDirectives();
     basic_xstring fileName;
     if (token.type == TK_LPAREN) {
         fileName = ParseStringExpressionInBrackets("@import", false);
-        AdvanceWritePos(cursor.begin(), false);
-        // The directive stays in the output with the evaluated name as a literal, so that a reader of the
+        // A kept directive stays in the output with the evaluated name as a literal, so that a reader of the
         // expanded text meets every import at its place. The name is escaped, so that a quote or a backslash
         // in it reads back unchanged.
-        WriteCalculatedSubString("@import " + MakeDoubleQuotedString(fileName));
+        if (keep) {
+            AdvanceWritePos(cursor.begin(), false);
+            WriteCalculatedSubString("@import " + MakeDoubleQuotedString(fileName));
+        }
     } else if (token.type == TK_DQ_STRING) {
         // The directive's own text stays pending and is copied to the output unchanged.
         token.GetLiteralString(fileName);
@@ -30,6 +33,8 @@ void MacroExpander::ProcessImportDirective() {
     }
     if (!importHandler->HandleImport(frame, fileName, position))
         throw LexScannerException("Can't import file: " + fileName, position);
+    // The blanks before the directive are still pending (it is not flushed), so its whole line can go.
+    if (!keep) ScanOverWhiteSpaceAfterDirective();
 }
 
 void MacroExpander::ProcessImportPathDirective() {
@@ -44,7 +49,10 @@ void MacroExpander::ProcessImportPathDirective() {
         throw LexScannerException(Compose("Quoted string expected after 'importpath' when read ", token),
                                   position);
     }
-    AdvanceWritePos(cursor.begin(), false);
+    if (importHandler->KeepsImportDirectives())
+        AdvanceWritePos(cursor.begin(), false);
+    else
+        ScanOverWhiteSpaceAfterDirective();
     if (!importHandler->HandleImportPath(path, position))
         throw LexScannerException("@importpath directive not supported", position);
 }

@@ -23,6 +23,11 @@ public:
     virtual bool HandleImportPath(const basic_xstring& path, const char* position);
     // Loads the named file and makes its definitions visible in frame; false if it cannot be imported.
     virtual bool HandleImport(VarFrame* frame, const basic_xstring& fileName, const char* position) = 0;
+    // Whether @import directives stay in the expansion (the default: a reader of the expanded text then meets
+    // each import at its place), or vanish as a @def line does, with the blanks before them, the rest of
+    // their line and the empty lines after it (for generated code, which must not carry them). @importpath
+    // leaves no text either way; it then goes with its line too.
+    virtual bool KeepsImportDirectives() const { return true; }
 
 protected:
     // Not deleted through this interface: the expander only calls it.

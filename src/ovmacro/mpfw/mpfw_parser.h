@@ -68,6 +68,12 @@ public:
     // Whether AddFile maps a large file into memory instead of reading it (the record's text then stays empty;
     // its Text() is the mapping): a host that reads the records' texts through Text() saves the copy.
     void SetMapLargeFiles(bool map) { mapLargeFiles_ = map; }
+    // Whether the expansions of the files loaded from now on keep their @import lines (they do by default).
+    // The reading steps meet an imported file's settings at its import, so a host that reads settings keeps
+    // them; a host that writes the expanded texts as generated code drops them, each with its line, as a @def
+    // line goes. The output pieces map what remains exactly.
+    void SetKeepImportDirectives(bool keep) { keepImportDirectives_ = keep; }
+    bool KeepsImportDirectives() const override { return keepImportDirectives_; }
     // From now on, the files loaded run under `restrictions`: an import or @importpath that would leave the
     // folders is refused with an error at the directive, before the file is read, and Python and the bounds
     // are set for the time of each load.
@@ -141,6 +147,7 @@ private:
     bool mapLargeFiles_ = false;
     // Records the file (its text or its mapping set) and expands it.
     MpfwSourceFile* AddFileRecord(std::unique_ptr<MpfwSourceFile> file);
+    bool keepImportDirectives_ = true;
     bool restricted_ = false;
     MpfwRestrictions restrictions_;
 };
