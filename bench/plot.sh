@@ -28,7 +28,7 @@ plot_time_against_size() {
       size=$(stat -c %s "$work/$workload-part.ovm")
       local -a ov=() m4=()
       for ((i = 0; i < plot_runs; i++)); do
-        run "$work/part.out" "$ovmacro" "$work/$workload-part.ovm"
+        run /dev/null "$ovmacro" -o "$work/part.out" "$work/$workload-part.ovm"
         ov+=("$wall")
         run "$work/part.out" m4 -P "$work/$workload-part.m4"
         m4+=("$wall")
