@@ -111,7 +111,7 @@ void MacroExpander::WritePlannedIteration(const LoopBlockPlan& plan, std::span<c
                 const MacroNestingGuard argumentLevel(part.at + 5), bodyLevel(item.begin());
                 MacroNestingGuard::ChargeOutput(item.size(), item.begin());
             }
-            StringStream literal;
+            StringStream literal(static_cast<size_t>(item.size()) + 8);  // most fit in the string itself
             WritePrefix(literal, SLM_Narrow);
             WriteTextForCStyleLiteralConstants(literal, item);
             WriteSuffix(literal, SLM_Narrow);

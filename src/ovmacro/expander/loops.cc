@@ -4,8 +4,10 @@
 #include "ovmacro/expander/directive_text.h"
 #include "ovmacro/expander/held_text.h"
 #include "ovmacro/expander/macro_expander.h"
+#include "ovmacro/expander/nesting_guard.h"
 #include "ovmacro/expander/plain_text.h"
 #include "ovmacro/foundations/compose.h"
+#include "ovmacro/foundations/scanning.h"
 #include "ovmacro/lexer/section_scanners.h"
 #include "ovmacro/lexer/token_scanner.h"
 
@@ -22,6 +24,28 @@ void BindLoopName(VarFrame& iterationFrame, VarFrame* loopFrame, BasicSubString 
 }
 
 }  // namespace
+
+BasicSubString MacroExpander::OrdinaryListText(BasicSubString listText) {
+    if (std::find(listText.begin(), listText.end(), '\n') != listText.end()) return {};
+    BasicSubString rest = listText;
+    ScanWhiteSpace(rest);
+    const char* wordBegin = rest.begin();
+    if (ScanIdentifier(rest)) {
+        const BasicSubString word(wordBegin, rest.begin());
+        ScanWhiteSpace(rest);
+        if (!rest.empty()) return {};
+        text = OrdinaryValueOfName(FindVariable(word), frame);
+        if (text.empty()) return {};
+        // The list's expansion is a level, and the macro's body one inside it.
+        const MacroNestingGuard listLevel(listText.begin()), bodyLevel(text.begin());
+        MacroNestingGuard::ChargeOutput(listText.size() - word.size() + text.size(), listText.begin());
+        return text;
+    }
+    if (!IsOrdinaryTextIn(listText, frame, DollarMacrosActive(frame))) return {};
+    const MacroNestingGuard listLevel(listText.begin());
+    MacroNestingGuard::ChargeOutput(listText.size(), listText.begin());
+    return listText;
+}
 
 void MacroExpander::ProcessForDirective() {
     LSToken token = ReadToken();
@@ -53,9 +77,15 @@ void MacroExpander::ProcessForDirective() {
 
     // Items are views into the expanded list, and so are the bodies of the loop names: the list is a held
     // text, which outlives the loop if its items define anything, and from which errors move to the source.
+    // A list that expands to itself, or the name of a macro whose body is such a list (one list used by
+    // several loops), is taken as it stands, where its items and their errors already lie in the source.
     HeldTextKeeper keeper(frame);
-    const HeldText& held = keeper.ExpandAndHold(" @for", listText);
-    const BasicSubString list = held.GetText();
+    const HeldText* held = nullptr;
+    BasicSubString list = OrdinaryListText(listText);
+    if (list.empty()) {
+        held = &keeper.ExpandAndHold(" @for", listText);
+        list = held->GetText();
+    }
     int64 indent = 0;
     BasicSubString block;
     try {
@@ -126,7 +156,7 @@ void MacroExpander::ProcessForDirective() {
                 MacroExpand(nullptr, &iterationFrame, block, indent, blockOutputIndent, *output);
             }
         } catch (LexScannerException& e) {
-            held.MovePositionOut(e);
+            if (held) held->MovePositionOut(e);
             // A call-chain line: a block that invokes itself would otherwise add one line per level.
             e.AppendCallContextLine(Compose("\n    in @for directive when ", singleName, " = ", item));
             throw;

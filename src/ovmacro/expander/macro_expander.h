@@ -94,6 +94,9 @@ private:
     void ProcessWhileDirective();
     void ProcessForDirective();
     // One iteration of a @for block cut by PlanLoopBlock (loop_block.h), with the items of its loop names.
+    // The text that a @for list expands to when that is known without expanding it (a view into the
+    // source), or empty.
+    BasicSubString OrdinaryListText(BasicSubString listText);
     void WritePlannedIteration(const LoopBlockPlan& plan, std::span<const BasicSubString> items, BasicSubString block,
                                int64 blockOutputIndent);
     // Assignment and scope.

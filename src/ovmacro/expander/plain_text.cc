@@ -13,6 +13,7 @@
 #include "ovmacro/lexer/token_scanner.h"
 #include "ovmacro/vars/name_filter.h"
 #include "ovmacro/vars/var_frame.h"
+#include "ovmacro/vars/variable.h"
 
 namespace orvan {
 
@@ -226,6 +227,17 @@ bool IsOrdinaryTextIn(BasicSubString text, VarFrame* frame, bool dollarMacrosAct
     } catch (const LexScannerException&) {
         return false;
     }
+}
+
+BasicSubString OrdinaryValueOfName(LSVariable* v, VarFrame* frame) {
+    auto* m = dynamic_cast<LSMacroVariable*>(v);
+    if (!m || m->GetNumArgs() != 0 || m->IsPython() || m->IsNaked() || m->GetReturnType() != LSV_Macro) return {};
+    const BasicSubString body = m->GetSubstitutionString();
+    VarFrame* context = m->GetContext() ? m->GetContext() : frame;
+    if (body.empty() || std::find(body.begin(), body.end(), '\n') != body.end() ||
+        !IsOrdinaryTextIn(body, context, DollarMacrosActive(context)))
+        return {};
+    return body;
 }
 
 }  // namespace orvan

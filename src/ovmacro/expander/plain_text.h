@@ -22,6 +22,7 @@ PlainTextRun SkipPlainText(const char* p, const char* end, bool lineFeedsNeedWor
 PlainTextRun SkipPlainTextWithoutNames(const char* p, const char* end, bool lineFeedsNeedWork,
                                        bool dollarMacrosActive);
 
+class LSVariable;
 class VarFrame;
 
 // Whether dollar macros can change a double-quoted literal in a text expanded in `frame`.
@@ -29,5 +30,10 @@ bool DollarMacrosActive(const VarFrame* frame);
 // Whether `text` expands to itself in `frame`: ordinary text, and names that no variable there has. Whatever
 // would raise an error (a lookup, the scanner) makes it false, and the expansion reports it.
 bool IsOrdinaryTextIn(BasicSubString text, VarFrame* frame, bool dollarMacrosActive);
+
+// The body of `v` when it is a macro without arguments whose body is ordinary text on one line where it
+// expands (in `frame` unless the macro has a frame of its own): what its expansion would be, found without
+// expanding it. Empty when the expansion is needed.
+BasicSubString OrdinaryValueOfName(LSVariable* v, VarFrame* frame);
 
 }  // namespace orvan

@@ -53,19 +53,6 @@ void WriteSuffix(xostream& os, EStrLiteralMode /*mode*/) {
     os << '"';
 }
 
-// The text of a macro without arguments (a loop name, a constant) that is ordinary text where it expands: what
-// its expansion would be, found without expanding it; empty when the expansion is needed.
-BasicSubString OrdinaryValueOfName(LSVariable* v, VarFrame* frame) {
-    auto* m = dynamic_cast<LSMacroVariable*>(v);
-    if (!m || m->GetNumArgs() != 0 || m->IsPython() || m->IsNaked() || m->GetReturnType() != LSV_Macro) return {};
-    const BasicSubString body = m->GetSubstitutionString();
-    VarFrame* context = m->GetContext() ? m->GetContext() : frame;
-    if (body.empty() || std::find(body.begin(), body.end(), '\n') != body.end() ||
-        !IsOrdinaryTextIn(body, context, DollarMacrosActive(context)))
-        return {};
-    return body;
-}
-
 void MacroExpander::ProcessStrDirective(bool isX, EStrLiteralMode mode) {
     int64 indent = 0;
     const BasicSubString argument = ScanRndBrackettedString(cursor, indent);
@@ -89,7 +76,7 @@ void MacroExpander::ProcessStrDirective(bool isX, EStrLiteralMode mode) {
     }
 
     const OutputIndentOverride lineUp(outputIndent, GetOutputPos());
-    StringStream literal;
+    StringStream literal(static_cast<size_t>(expanded.size()) + 8);
     WritePrefix(literal, mode);
     bool wroteLine = false;
     if (!isX) WriteTextForCStyleLiteralConstants(literal, expanded);

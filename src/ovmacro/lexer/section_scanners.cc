@@ -7,6 +7,7 @@
 #include "ovmacro/foundations/compose.h"
 #include "ovmacro/foundations/scanning.h"
 #include "ovmacro/lexer/bracket_index.h"
+#include "ovmacro/lexer/char_classes.h"
 #include "ovmacro/lexer/exceptions.h"
 #include "ovmacro/lexer/token_scanner.h"
 
@@ -214,9 +215,49 @@ void DecodeQuotedString(BasicSubString s, xostream* os, const char* endName) {
     if (os) os->put(run, s.begin() - run);
 }
 
-}  // namespace
+// Skips the tokens of an argument that can neither fail nor open, close or end anything (names, plain
+// integers, quoted literals, operators, the punctuation "#.;~\\`") and the white space between them, and
+// stops before any other, which the token scanner reads. Returns the end of the last token skipped, or null.
+const char* SkipQuietTokens(BasicSubString& s) {
+    const char* p = s.begin();
+    const char* const end = s.end();
+    const char* last = nullptr;
+    while (p < end) {
+        switch (ClassOf(*p)) {
+            case CharClass::kWhiteSpace:
+            case CharClass::kLineFeed: ++p; continue;
+            case CharClass::kIdentifier:
+                if (BeginsRawLiteral(p, end)) break;
+                for (++p; p < end && IsIdentifierChar(*p);) ++p;
+                last = p;
+                continue;
+            case CharClass::kDigit:
+                if (const char* q = EndOfPlainInteger(p, end)) {
+                    last = p = q;
+                    continue;
+                }
+                break;
+            case CharClass::kOperator: last = ++p; continue;
+            case CharClass::kSingle:
+                if (*p == ',' || *p == '(' || *p == ')' || *p == '[' || *p == ']' || *p == '{' || *p == '}') break;
+                last = ++p;
+                continue;
+            case CharClass::kSingleQuote:
+            case CharClass::kDoubleQuote: {
+                BasicSubString literal(p, end);
+                LsScanLiteralString(literal, *p, *p == '\'' ? "single quoted string" : "double quoted string");
+                last = p = literal.begin();
+                continue;
+            }
+            default: break;
+        }
+        break;
+    }
+    s.SetBegin(p);
+    return last;
+}
 
-LSToken ScanArgument(BasicSubString& s, BasicSubString& arg, EToken terminator) {
+LSToken ScanArgumentIn(BasicSubString& s, BasicSubString& arg, EToken terminator, bool skipQuietTokens) {
     ScanWhiteSpace(s);
     const char* start = s.begin();
 
@@ -260,6 +301,9 @@ LSToken ScanArgument(BasicSubString& s, BasicSubString& arg, EToken terminator) 
     int64 depth = 0;
     for (;;) {
         arg.SetEnd(s.begin());
+        if (skipQuietTokens) {
+            if (const char* quietEnd = SkipQuietTokens(s)) arg.SetEnd(quietEnd);
+        }
         const LSToken t = LsScanToken(s, false);
         if (t.type == TK_EOS) {
             StringStream ss;
@@ -291,6 +335,17 @@ LSToken ScanArgument(BasicSubString& s, BasicSubString& arg, EToken terminator) 
             }
         }
     }
+}
+
+}  // namespace
+
+LSToken ScanArgument(BasicSubString& s, BasicSubString& arg, EToken terminator) {
+    // Quiet tokens are those that cannot be the terminator either: a closing bracket, as for every caller.
+    return ScanArgumentIn(s, arg, terminator, terminator == TK_RPAREN || terminator == TK_RBRACKET);
+}
+
+LSToken ScanArgumentTokenByToken(BasicSubString& s, BasicSubString& arg, EToken terminator) {
+    return ScanArgumentIn(s, arg, terminator, false);
 }
 
 BasicSubString ScanBrackettedSection(BasicSubString& s, bool readOpen, EToken open, EToken close) {
