@@ -35,7 +35,9 @@
 #   plain sizes   the plain text at 40, 80, 160 and 200 MB (the 40 MB text repeated): wall time, peak RSS,
 #                 and how the time grows with the size (3 alternating runs each).
 # Each tool runs RUNS times, alternating with the other (after one untimed run each). ovmacro writes its
-# output with -o, m4 to its standard output, each into a file.
+# output with -o, m4 to its standard output, each into a new file: before each timed run the previous output is
+# removed and the file system synced (outside the timing), so that neither tool pays for writing back or
+# freeing what the other wrote.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 runs=${RUNS:-7}
@@ -178,6 +180,12 @@ run() {
   cpu=$(awk 'END { printf "%.2f", $3 + $4 }' "$work/time")
 }
 
+# fresh FILE...: removes the files and writes back whatever waits to be written, before a timed run.
+fresh() {
+  rm -f "$@"
+  sync
+}
+
 median() { sort -g | awk '{ v[NR] = $1 } END { print (NR % 2) ? v[(NR + 1) / 2] : (v[NR / 2] + v[NR / 2 + 1]) / 2 }'; }
 
 printf '\n%-13s %-8s %8s %8s %18s %12s\n' workload tool 'wall s' 'cpu s' 'throughput' 'peak RSS MB'
@@ -195,8 +203,10 @@ bench() {
     exit 1
   }
   for ((i = 0; i < runs; i++)); do
+    fresh "$work/$name.ovmacro.out"
     run /dev/null "$ovmacro" -o "$work/$name.ovmacro.out" "$work/$name.ovm"
     ov_wall+=("$wall") ov_cpu+=("$cpu") ov_rss+=("$rss")
+    fresh "$work/$name.m4.out"
     run "$work/$name.m4.out" m4 -P -I "$work" "$work/$name.m4"
     m4_wall+=("$wall") m4_cpu+=("$cpu") m4_rss+=("$rss")
   done
@@ -276,8 +286,10 @@ sizes() {
     bytes=$(stat -c %s "$work/big.ovm")
     local -a ow=() oc=() orss=() mw=() mc=() mrss=()
     for ((i = 0; i < 3; i++)); do
+      fresh "$work/big.ovmacro.out"
       run /dev/null "$ovmacro" -o "$work/big.ovmacro.out" "$work/big.ovm"
       ow+=("$wall") oc+=("$cpu") orss+=("$rss")
+      fresh "$work/big.m4.out"
       run "$work/big.m4.out" m4 -P "$work/big.ovm"
       mw+=("$wall") mc+=("$cpu") mrss+=("$rss")
     done
