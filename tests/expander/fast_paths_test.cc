@@ -111,6 +111,16 @@ TEST(PlainBodyTest, ExpandsLikeTheGeneralWay) {
         {"@let int n = 7\n@def m(a) = {(a)%%}\nm(n)\n", "(7)\n"},
         {"@def g(x) = {x}\n@def m(a) = {[a]%%}\nm(g)\n", "error@37 ( expected to begin argument list for macro g(x)"},
         {"@def m(a, b) = {a+b%%}\nm(1, m(2, @fail(\"deep\")))\n", "error@36 deep"},
+        // Parts of bodies and name arguments written without a look at their characters: the column after
+        // them, a tab, a line start that still needs its indentation, parts too long for that.
+        {"@def two = {1\n2}\n@def m(a, b) = {(a, b%%)}\nm(xx, two)\n", "(xx, 1\n     2)\n"},
+        {"@def two = {1\n2}\n@def m(a, b) = {\ta, b%%}\nm(xx, two)\n", "\txx, 1\n        2\n"},
+        {"@def m(a) = {a\na%%}\n  m(x)\n", "  x\n  x\n"},
+        {"@def m(a) = {a and a text longer than thirty-two bytes%%}\n m(x)\n", " x and x text longer than"},
+        // Argument lists of names, read in one pass (a mark after "(" makes the general way read them).
+        {"@def m(a, b) = {[a|b]}\nm(%%x ,\n y\t) m(%%r, s)m(%%x, r'q')\n", "[x|y] [r|s][x|r'q']\n"},
+        {"@def m(a, b) = {[a|b]}\nm(%%x)\n", "error@26 Insufficient arguments provided for macro m(a,b)"},
+        {"@def m(a, b) = {[a|b]}\nm(%%x, y, z)\n", "error@29 Too many arguments provided for macro m(a,b)"},
     };
     for (const auto& [text, expected] : cases) {
         const std::string fast = ExpandWithMarks(text, "");
@@ -125,6 +135,10 @@ TEST(PlainBodyTest, ExpandsLikeTheGeneralWay) {
     const std::string deep = "@def m(a) = {<a>%%}\n" + calls;
     EXPECT_NE(ExpandWithMarks(deep, "").find("nested too deeply"), std::string::npos);
     EXPECT_EQ(ExpandWithMarks(deep, ""), ExpandWithMarks(deep, "@@"));
+    // Enough calls to fill the gathered output many times over.
+    std::string many = "@def m(a, b) = {<a b>%%}\n";
+    for (int i = 0; i < 100; ++i) many += "m(x" + std::to_string(i) + ", y)\t";
+    EXPECT_EQ(ExpandWithMarks(many, ""), ExpandWithMarks(many, "@@"));
 }
 
 // Loop blocks cut once into parts, and @str of a name whose value is ordinary text, against the general way

@@ -85,8 +85,9 @@ private:
     void InvokeVariable(LSVariable* v);
     void InvokeMacroFunction(LSMacroVariable* m);
     // Expands a call whose body is ordinary text apart from the names of untyped arguments; false, having
-    // written nothing, for any other macro.
-    bool ExpandPlainBody(const LSMacroVariable& m, VarFrame* parentFrame, std::span<const BasicSubString> actual);
+    // written nothing, for any other macro. `namesOnly`: each argument is known to be one identifier.
+    bool ExpandPlainBody(const LSMacroVariable& m, VarFrame* parentFrame, std::span<const BasicSubString> actual,
+                         bool namesOnly);
     basic_xstring EvaluateString(BasicSubString text, BasicSubString directiveName);
     // Conditionals and loops.
     void ProcessIfDirective();

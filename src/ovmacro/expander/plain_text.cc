@@ -212,11 +212,11 @@ bool DollarMacrosActive(const VarFrame* frame) {
     return scope && (!scope->dollarMacros.empty() || !scope->importedFiles.empty());
 }
 
+bool NamesVariableIn(BasicSubString name, VarFrame* frame) { return frame->Find(name, name.end()) != nullptr; }
+
 bool IsOrdinaryTextIn(BasicSubString text, VarFrame* frame, bool dollarMacrosActive) {
     // The commonest text, one word, is known from the filter of names (and a lookup when it may be one).
-    if (!text.empty() && IsIdentifierStart(text.front()) && !BeginsRawLiteral(text.begin(), text.end()) &&
-        std::all_of(text.begin() + 1, text.end(), IsIdentifierChar))
-        return !NameFilter::MayContain(text) || !frame->Find(text, text.end());
+    if (IsOneWord(text)) return IsOrdinaryWordIn(text, frame);
     try {
         for (const char* p = text.begin();;) {
             const PlainTextRun run = SkipPlainText(p, text.end(), false, dollarMacrosActive);
