@@ -49,7 +49,49 @@ bool ParseSize(const std::string& text, long long& size) {
     return true;
 }
 
+constexpr const char* kWarningNames[kWarningCount] = {"unknown-directive", "unused-macro", "unused-argument",
+                                                      "shadow"};
+
+// -Wall, -Werror, -WNAME or -Wno-NAME; false for a name that is no warning.
+bool ParseWarningSwitch(std::string_view arg, WarningSwitches& switches) {
+    std::string_view name = arg.substr(2);
+    if (name == "all" || name == "error") {
+        (name == "all" ? switches.all : switches.errors) = true;
+        return true;
+    }
+    const bool on = name.substr(0, 3) != "no-";
+    if (!on) name.remove_prefix(3);
+    for (int w = 0; w < kWarningCount; ++w)
+        if (name == kWarningNames[w]) {
+            switches.named[w] = on ? 1 : 0;
+            return true;
+        }
+    return false;
+}
+
+// --trace=NAME,...: the names, none of them empty.
+bool ParseTraceNames(std::string_view list, std::vector<std::string>& names) {
+    for (size_t from = 0;;) {
+        const size_t comma = list.find(',', from);
+        const std::string_view name =
+            list.substr(from, comma == std::string_view::npos ? comma : comma - from);
+        if (name.empty()) return false;
+        names.emplace_back(name);
+        if (comma == std::string_view::npos) return true;
+        from = comma + 1;
+    }
+}
+
 }  // namespace
+
+const char* WarningName(Warning w) {
+    return kWarningNames[static_cast<int>(w)];
+}
+
+bool WarningSwitches::On(Warning w) const {
+    const signed char set = named[static_cast<int>(w)];
+    return set >= 0 ? set == 1 : all || w == Warning::kUnknownDirective;
+}
 
 const char* UsageText() {
     return "Usage: ovmacro [OPTIONS] [FILE]\n"
@@ -98,6 +140,26 @@ const char* UsageText() {
            "                 writing it; exit 0 when equal, 1 with a short unified diff when\n"
            "                 different or when OUT is missing; writes no file, so --deps and\n"
            "                 --source-map cannot be used with it\n"
+           "  -Wall          turn on every warning below\n"
+           "  -WNAME, -Wno-NAME\n"
+           "                 turn the warning NAME on or off, whatever the place of -Wall; each\n"
+           "                 warning names its switch, as [-Wunused-macro]:\n"
+           "                   unknown-directive  a word after @ that is no directive but close\n"
+           "                                      to one, as @deff or @esle (on by default)\n"
+           "                   unused-macro       a macro defined in the expanded files (not by\n"
+           "                                      -D) that is never invoked\n"
+           "                   unused-argument    an argument that its macro's body never names\n"
+           "                                      (not reported for names that begin with _)\n"
+           "                   shadow             a definition that hides one of the same name\n"
+           "                                      in an enclosing scope\n"
+           "  -Werror        warnings fail the run: exit 1, and nothing is written\n"
+           "  --trace[=NAME,...]\n"
+           "                 report each macro call (or only the calls of the macros named) on\n"
+           "                 standard error as it happens: its place, its arguments (typed ones\n"
+           "                 as values) and its result, indented by nesting; the blocks that\n"
+           "                 @if, @elseif, @else, @for and @while expand appear under those names\n"
+           "                 (--trace=@for; @if names a whole chain), Python macros as\n"
+           "                 \"python NAME\"\n"
            "  --help         show this text and exit\n"
            "  --version      show the version and exit\n"
            "\n"
@@ -130,8 +192,8 @@ const char* UsageText() {
            "the others.\n"
            "\n"
            "Exit status: 0 on success, 1 when the expansion or the settings fail (the error is\n"
-           "reported on standard error) or --check finds OUT different or missing, 2 on a usage\n"
-           "error, an unreadable FILE or an output that cannot be written.\n";
+           "reported on standard error), --check finds OUT different or missing or -Werror meets a\n"
+           "warning, 2 on a usage error, an unreadable FILE or an output that cannot be written.\n";
 }
 
 bool ParseOptions(int argc, char** argv, Options& options, std::string& error) {
@@ -205,6 +267,18 @@ bool ParseOptions(int argc, char** argv, Options& options, std::string& error) {
                 return false;
             if (!ParseSize(text, options.maxOutput)) {
                 error = "--max-output needs a size in bytes, with an optional K, M or G: " + text;
+                return false;
+            }
+        } else if (arg.substr(0, 2) == "-W") {
+            // Warnings and the trace, which explain an expansion without changing it.
+            if (!ParseWarningSwitch(arg, options.warnings)) {
+                error = "unknown warning option " + std::string(arg);
+                return false;
+            }
+        } else if (arg == "--trace" || arg.substr(0, 8) == "--trace=") {
+            options.trace = true;
+            if (arg.size() > 7 && !ParseTraceNames(arg.substr(8), options.traceNames)) {
+                error = "--trace= needs macro names, separated by commas";
                 return false;
             }
         } else if (arg.substr(0, 2) == "-o") {

@@ -9,6 +9,19 @@
 
 namespace ovmacro_tool {
 
+// The warnings, each with its switch -WNAME (see WarningName).
+enum class Warning { kUnknownDirective, kUnusedMacro, kUnusedArgument, kShadow };
+inline constexpr int kWarningCount = 4;
+const char* WarningName(Warning w);
+
+// -Wall, -WNAME, -Wno-NAME and -Werror. A switch that names a warning wins over -Wall, whatever their order.
+struct WarningSwitches {
+    signed char named[kWarningCount] = {-1, -1, -1, -1};  // 1: -WNAME, 0: -Wno-NAME, -1: neither
+    bool all = false;                                     // -Wall
+    bool errors = false;                                  // -Werror: warnings fail the run
+    bool On(Warning w) const;
+};
+
 struct Options {
     std::string inputPath = "-";  // "-" is standard input
     std::string outputPath;       // empty: standard output
@@ -23,6 +36,9 @@ struct Options {
     bool restricted = false;   // --restricted: for templates one did not write (see --help)
     long long maxOutput = 0;   // --max-output: the bound on what an expansion produces, in bytes
     DiagnosticStyle diagnostics = DiagnosticStyle::kDefault;  // --diagnostics: the form of error reports
+    WarningSwitches warnings;                                 // -W...
+    bool trace = false;                                       // --trace: report macro calls as they happen
+    std::vector<std::string> traceNames;                      // --trace=NAME,...: only these; empty: all
     bool help = false;
     bool version = false;
 };
