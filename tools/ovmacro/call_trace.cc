@@ -105,8 +105,9 @@ void CallTrace::BlockBegan(std::string_view directive, BasicSubString at, BasicS
 }
 
 void CallTrace::Begin(Open open) {
+    open.depth = open_.empty() ? 0 : open_.back().depth + open_.back().shown;
     if (open.shown) {
-        WritePendingHeads(open_.size());
+        WritePendingHeads();
         const basic_xstring* written = Written(*open.output);
         open.outputStart = written ? written->size() : kNotShown;
     }
@@ -126,14 +127,15 @@ std::string CallTrace::Head(const Open& open) const {
     return head + ")";
 }
 
-void CallTrace::WritePendingHeads(size_t count) {
-    size_t depth = 0;
-    for (size_t i = 0; i < count; ++i) {
+void CallTrace::WritePendingHeads() {
+    // The heads below one that is out are out: only the innermost open calls are looked at.
+    size_t first = open_.size();
+    while (first > 0 && !(open_[first - 1].shown && open_[first - 1].printed)) --first;
+    for (size_t i = first; i < open_.size(); ++i) {
         Open& open = open_[i];
         if (!open.shown) continue;
-        if (!open.printed) WriteLine(open, depth, Head(open));
+        WriteLine(open, Head(open));
         open.printed = true;
-        ++depth;
     }
 }
 
@@ -143,7 +145,7 @@ void CallTrace::Ended(bool failed) {
     const Open open = std::move(open_.back());
     open_.pop_back();
     if (open.shown) {
-        WritePendingHeads(open_.size());
+        WritePendingHeads();
         const basic_xstring* written = Written(*open.output);
         std::string result = " -> (not shown)";
         if (failed)
@@ -152,14 +154,15 @@ void CallTrace::Ended(bool failed) {
             result = written->size() == open.outputStart
                          ? " -> (empty)"
                          : " -> " + ShownText(std::string_view(*written).substr(open.outputStart));
-        size_t depth = 0;
-        for (const Open& outer : open_) depth += outer.shown;
-        WriteLine(open, depth, (open.printed ? open.name : Head(open)) + result);
+        WriteLine(open, (open.printed ? open.name : Head(open)) + result);
     }
 }
 
-void CallTrace::WriteLine(const Open& open, size_t depth, const std::string& text) {
-    writer_.Write(open.at, "trace", std::string(2 * depth, ' ') + text, false);
+void CallTrace::WriteLine(const Open& open, const std::string& text) {
+    // Deep recursions would push the text far to the right: past kIndentedLevels the depth is a number.
+    std::string indent(2 * std::min(open.depth, kIndentedLevels), ' ');
+    if (open.depth > kIndentedLevels) indent += "[" + std::to_string(open.depth) + "] ";
+    writer_.Write(open.at, "trace", indent + text, false);
 }
 
 }  // namespace ovmacro_tool

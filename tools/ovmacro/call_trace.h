@@ -6,7 +6,8 @@
 //     t.ovm(5) : trace: outer -> <[1]>
 //
 // A call in which no other reported call happens takes one line, "HEAD -> RESULT"; another opens with its
-// head and closes with "NAME -> RESULT" ("... failed" when an error ends it). The head shows the arguments as
+// head and closes with "NAME -> RESULT" ("... failed" when an error ends it); past kIndentedLevels levels the
+// depth is written as "[DEPTH] " after the blanks instead of more of them. The head shows the arguments as
 // written, typed ones as their values; Python macros read "python NAME(...)", blocks "@if(CONDITION)",
 // "@elseif(...)", "@else", "@for NAME = ITEM", "@while(CONDITION)". Texts are shown on one line (a line feed
 // as \n) and cut after kShownBytes bytes, with "...(N bytes)". The bindings of arguments and loop names are
@@ -26,6 +27,7 @@ namespace ovmacro_tool {
 class CallTrace {
 public:
     static constexpr size_t kShownBytes = 60;
+    static constexpr size_t kIndentedLevels = 24;
 
     // `names`: the macros (and directives, "@if" for a whole chain) to report; empty: all.
     CallTrace(ReportWriter& writer, std::vector<std::string> names)
@@ -42,6 +44,7 @@ private:
     struct Open {
         bool shown = false;
         bool printed = false;  // its head line is out
+        size_t depth = 0;      // the reported calls open around it
         const char* at = nullptr;
         std::string name;                                  // the macro or directive
         std::string head;                                  // for a block: all of it
@@ -54,9 +57,9 @@ private:
     bool Wanted(std::string_view name) const;
     void Begin(Open open);
     std::string Head(const Open& open) const;
-    // Writes the heads not out yet of the reported calls among the `count` outermost open ones.
-    void WritePendingHeads(size_t count);
-    void WriteLine(const Open& open, size_t depth, const std::string& text);
+    // Writes the heads of the open reported calls that are not out yet, outermost first.
+    void WritePendingHeads();
+    void WriteLine(const Open& open, const std::string& text);
 
     ReportWriter& writer_;
     std::vector<std::string> names_;
