@@ -16,10 +16,11 @@ void MacroExpander::ProcessIfDirective() {
     BasicSubString chosenBlock;
     int64 chosenIndent = 0;
     // For an observer: the directive that chose the block, where it stands, and its condition as written.
-    const char* chosenBy = "";
+    std::string_view chosenBy;
     const char* chosenAt = nullptr;
     BasicSubString chosenCondition;
-    auto consider = [&](const char* directive, const char* at, const char* conditionBegin, bool condition) {
+    auto consider = [&](std::string_view directive, const char* at, const char* conditionBegin,
+                        bool condition) {
         const BasicSubString conditionText(conditionBegin, cursor.begin());
         int64 indent = 0;
         const BasicSubString block = ScanSubstString(cursor, indent);
