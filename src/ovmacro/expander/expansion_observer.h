@@ -60,13 +60,13 @@ public:
 
     // Installs an observer on the calling thread for its lifetime, and puts back the one installed before.
     class Installation {
-      public:
+    public:
         Installation(ExpansionObserver& observer, bool watchCalls);
         ~Installation();
         Installation(const Installation&) = delete;
         Installation& operator=(const Installation&) = delete;
 
-      private:
+    private:
         ExpansionObserver* current_;
         ExpansionObserver* callWatcher_;
     };
@@ -82,28 +82,26 @@ private:
 // A call or a block while it runs, reported to the call watcher, if any, when it begins and when it ends.
 class ObservedExpansion {
 public:
-    ObservedExpansion(const LSMacroVariable& m, BasicSubString at, std::span<const BasicSubString> arguments,
-                      ExpandedOutput& output)
+    // `arguments` (a container of BasicSubString with view()) and the others are read only when watched.
+    template <class Arguments>
+    ObservedExpansion(const LSMacroVariable& m, const BasicSubString& at, const Arguments& arguments,
+                      ExpandedOutput* const& output)
         : watcher_(ExpansionObserver::CallWatcher()) {
-        if (watcher_) [[unlikely]]
-            BeginCall(m, at, arguments, output);
+        if (watcher_) [[unlikely]] BeginCall(m, at, arguments.view(), *output);
     }
     ObservedExpansion(std::string_view directive, BasicSubString at, BasicSubString name,
                       BasicSubString value, ExpandedOutput& output)
         : watcher_(ExpansionObserver::CallWatcher()) {
-        if (watcher_) [[unlikely]]
-            BeginBlock(directive, at, name, value, output);
+        if (watcher_) [[unlikely]] BeginBlock(directive, at, name, value, output);
     }
     ~ObservedExpansion() {
-        if (watcher_) [[unlikely]]
-            End();
+        if (watcher_) [[unlikely]] End();
     }
     ObservedExpansion(const ObservedExpansion&) = delete;
     ObservedExpansion& operator=(const ObservedExpansion&) = delete;
 
     void Bound(std::span<LSVariable* const> bindings) const {
-        if (watcher_) [[unlikely]]
-            watcher_->CallBound(bindings);
+        if (watcher_) [[unlikely]] watcher_->CallBound(bindings);
     }
 
 private:

@@ -50,7 +50,7 @@ void MacroExpander::InvokeVariable(LSVariable* v) {
     // Macros rarely take more than a few arguments: their texts and bindings then need no allocation.
     constexpr size_t kInlineArgs = 4;
     SmallBuffer<BasicSubString, kInlineArgs> actual(static_cast<size_t>(n));
-    const ObservedExpansion observed(*m, currentToken, actual.view(), *output);
+    const ObservedExpansion observed(*m, currentToken, actual, output);
     if (n > 0) {
         const LSToken open = ReadToken();
         if (open.type != TK_LPAREN)
