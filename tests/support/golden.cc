@@ -80,13 +80,13 @@ std::string Normalised(const std::string& report) {
 // follow a located first line are left out, and so are warnings and notes, which '?' cases check.
 std::vector<std::string> Reports(const std::string& err) {
     static const std::regex located(R"(^(?:t\.ovm:)?((?:.*:)?\d+:\d+): error: (.*))");
-    static const std::regex aside(R"(^.*:\d+:\d+: (warning|note): .*)");
+    static const std::regex aside(R"(^(.*:\d+:\d+|ovmacro): (warning|note): .*)");
     std::vector<std::string> reports;
     std::istringstream in(err);
     std::smatch m;
     for (std::string line; std::getline(in, line);) {
-        if (std::regex_match(line, aside)) {
-            for (int echo = 0; echo < 2 && std::getline(in, line);) ++echo;
+        if (std::regex_match(line, m, aside)) {
+            for (int echo = 0; m[1] != "ovmacro" && echo < 2 && std::getline(in, line);) ++echo;
         } else if (std::regex_match(line, m, located)) {
             reports.push_back(m[1].str() + " " + m[2].str());
             for (int echo = 0; echo < 2 && std::getline(in, line);) ++echo;
