@@ -1,5 +1,6 @@
 // @for over a list or a list of tuples, and @while: expand a block once per item or while a condition holds.
 #include "ovmacro/expander/directive_text.h"
+#include "ovmacro/expander/expansion_observer.h"
 #include "ovmacro/expander/held_text.h"
 #include "ovmacro/expander/macro_expander.h"
 #include "ovmacro/foundations/compose.h"
@@ -107,6 +108,7 @@ void MacroExpander::ProcessForDirective() {
             }
         }
         try {
+            const ObservedExpansion observed("@for", currentToken, singleName, item, *output);
             MacroExpand(nullptr, &iterationFrame, block, indent, blockOutputIndent, *output);
         } catch (LexScannerException& e) {
             held.MovePositionOut(e);
@@ -134,6 +136,7 @@ void MacroExpander::ProcessWhileDirective() {
     while (EvaluateConditionText(frame, condition, "@while", currentToken.begin())) {
         if (block.empty()) continue;
         VarFrame iterationFrame(frame);
+        const ObservedExpansion observed("@while", currentToken, BasicSubString(), condition, *output);
         MacroExpand(nullptr, &iterationFrame, block, indent, blockOutputIndent, *output);
     }
 }

@@ -126,7 +126,8 @@ void MacroExpander::ProcessRndBracketDirective() {
     const basic_xstring expanded = ExpandInChildFrame(frame, section, 0);
     basic_xstring value;
     // Any type is accepted and written as its text.
-    ParseDirectiveText(expanded, "@", currentToken.begin(), [&](ExpressionParser& p) { value = p.ParseString(true); });
+    ParseDirectiveText(frame, expanded, "@", currentToken.begin(),
+                       [&](ExpressionParser& p) { value = p.ParseString(true); });
     WriteCalculatedSubString(BasicSubString(value));
 }
 
