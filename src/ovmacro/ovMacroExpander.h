@@ -13,6 +13,7 @@
 // lower layers (tokens, section scanners, literal operators) stay available one by one.
 #pragma once
 
+#include "ovmacro/expander/expansion_observer.h"
 #include "ovmacro/expander/import_handler.h"
 #include "ovmacro/expander/macro_expander.h"
 #include "ovmacro/expr/expression_parser.h"

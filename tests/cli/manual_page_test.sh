@@ -12,9 +12,11 @@ if [ -s "$work/warnings" ]; then echo "man -l $page warned:"; cat "$work/warning
 for heading in NAME SYNOPSIS DESCRIPTION OPTIONS 'THE LANGUAGE AT A GLANCE' DIAGNOSTICS 'EXIT STATUS' EXAMPLES; do
   grep -qx "$heading" "$work/page" || { echo "no section $heading in the page"; exit 1; }
 done
-# The option lines: "  -o, --output=OUT" in --help, "       -o, --output=OUT" in the page.
-form='(-[a-zA-Z], )?--[a-z-]+(=[A-Z=]+)?'
-"$tool" --help | grep -E "^  (-[a-zA-Z], |    )--" | sed 's/^ *//; s/  .*//' | sort >"$work/help-options"
-grep -E "^       $form\$" "$work/page" | sed 's/^ *//' | sort >"$work/page-options"
+# The option lines: "  -o, --output=OUT" in --help, "       -o, --output=OUT" in the page; also the forms
+# "--trace[=NAME,...]" and "-WNAME".
+form='((-[a-zA-Z], )?--[a-z-]+(=[A-Z=]+|\[=[A-Z,.]+\])?|-[a-zA-Z][A-Z]+)'
+"$tool" --help | grep -E "^  ((-[a-zA-Z], |    )--|-[a-zA-Z][A-Z])" | sed 's/^ *//; s/  .*//' | sort >"$work/help-options"
+# (A form shorter than the indentation shares its line with the help.)
+grep -E "^       $form(\$| )" "$work/page" | sed -E "s/^ *($form).*/\\1/" | sort >"$work/page-options"
 [ -s "$work/help-options" ] || { echo "no option found in --help"; exit 1; }
 diff "$work/help-options" "$work/page-options" || { echo "--help and the page list different options"; exit 1; }

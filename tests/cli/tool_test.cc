@@ -18,12 +18,12 @@ TEST(OvmacroTool, ArgumentsThatCaseFilesCannotSpell) {
     const struct {
         std::vector<std::string> args;
         int exitCode;
-        std::string out;  // a pattern
+        std::string out;  // a pattern, or the beginning of the output followed by "..."
         std::string err;
     } cases[] = {
         // --help and --version read no file, whatever follows them.
-        {{"--help", "missing.txt"}, 0, R"(Usage: ovmacro \[OPTIONS\] \[FILE\]\n[\s\S]*)", ""},
-        {{"-h"}, 0, R"(Usage: ovmacro [\s\S]*)", ""},
+        {{"--help", "missing.txt"}, 0, "Usage: ovmacro [OPTIONS] [FILE]\n...", ""},
+        {{"-h"}, 0, "Usage: ovmacro ...", ""},
         {{"--version", "missing.txt"}, 0, R"(ovmacro \d+\.\d+\.\d+\n)", ""},
         {{"-D", "X=a  b", "-D", "Y=(X, X)"}, 0, R"(a  b \(a  b, a  b\)\n)", ""},
         {{"-D", "X=a\nb"}, 2, "", "ovmacro: -D text must be a single line: X\nTry 'ovmacro --help'.\n"},
@@ -32,7 +32,11 @@ TEST(OvmacroTool, ArgumentsThatCaseFilesCannotSpell) {
         SCOPED_TRACE(c.args[0] + " " + c.args.back());
         const ToolResult r = RunTool(c.args, "X Y\n");
         EXPECT_EQ(r.exitCode, c.exitCode);
-        EXPECT_TRUE(std::regex_match(r.out, std::regex(c.out))) << r.out;
+        // (A pattern over the whole help would recurse deep enough to overflow a sanitizer's stack.)
+        const bool begins = c.out.ends_with("...");
+        EXPECT_TRUE(begins ? r.out.starts_with(c.out.substr(0, c.out.size() - 3))
+                           : std::regex_match(r.out, std::regex(c.out)))
+            << r.out;
         EXPECT_EQ(r.err, c.err);
     }
 }

@@ -76,15 +76,18 @@ std::string Normalised(const std::string& report) {
 }
 
 // The reports of a gnu-form standard error as '!' texts, normalised: "LINE:COL MESSAGE" in t.ovm,
-// "FILE:LINE:COL MESSAGE" elsewhere, "- MESSAGE" without a place; the echoed source line and caret that follow
-// a located first line are left out.
+// "FILE:LINE:COL MESSAGE" elsewhere, "- MESSAGE" without a place; the echoed source line and caret that
+// follow a located first line are left out, and so are warnings and notes, which '?' cases check.
 std::vector<std::string> Reports(const std::string& err) {
     static const std::regex located(R"(^(?:t\.ovm:)?((?:.*:)?\d+:\d+): error: (.*))");
+    static const std::regex aside(R"(^(.*:\d+:\d+|ovmacro): (warning|note): .*)");
     std::vector<std::string> reports;
     std::istringstream in(err);
     std::smatch m;
     for (std::string line; std::getline(in, line);) {
-        if (std::regex_match(line, m, located)) {
+        if (std::regex_match(line, m, aside)) {
+            for (int echo = 0; m[1] != "ovmacro" && echo < 2 && std::getline(in, line);) ++echo;
+        } else if (std::regex_match(line, m, located)) {
             reports.push_back(m[1].str() + " " + m[2].str());
             for (int echo = 0; echo < 2 && std::getline(in, line);) ++echo;
         } else if (line.rfind("ovmacro: error: ", 0) == 0) {

@@ -18,7 +18,8 @@
 //
 // In a text, \n \t \r \\ and \xHH stand for their characters; any other backslash stays as written. Errors
 // are checked in the gnu form (FILE:LINE:COLUMN: error: MESSAGE, then the echoed source line and its caret,
-// which the tool's own cases check, then the other lines of the message). The depth named by "Macro expansion
+// which the tool's own cases check, then the other lines of the message); warnings and notes are left out of
+// them, and checked with '?'. The depth named by "Macro expansion
 // nested too deeply", and the chain of calls below it, depend on the build's stack and are compared as
 // placeholders.
 //

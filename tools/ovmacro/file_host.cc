@@ -118,6 +118,7 @@ bool FileHost::HandleImportPath(const basic_xstring& path, const char* position)
 void FileHost::ReportError(const LexScannerException& e) {
     WriteDiagnostic(xcerr(), mpfwFrame->sourceFiles, e, diagnostics_);
     xcerr().flush();
+    if (notes_) notes_(e);
 }
 
 void FileHost::OnImport(MpfwSourceFile* file) {

@@ -12,6 +12,7 @@
 //     if (host.LoadFile("root.ovp", error) == FileHost::Load::kOk) host.PrintSettings(orvan::xcout());
 #pragma once
 
+#include <functional>
 #include <map>
 #include <set>
 #include <string>
@@ -59,6 +60,10 @@ public:
     // Writes the report of an error on standard error, in the form chosen with SetDiagnosticStyle.
     void ReportError(const orvan::LexScannerException& e) override;
     void SetDiagnosticStyle(DiagnosticStyle style) { diagnostics_ = style; }
+    // What writes the notes after each error report (none: no notes).
+    void SetNotesWriter(std::function<void(const orvan::LexScannerException&)> notes) {
+        notes_ = std::move(notes);
+    }
 
 private:
     // The directory of the file whose import is being handled or read; empty for the working directory.
@@ -77,6 +82,7 @@ private:
     orvan::MpfwSourceFile* pendingImport_ = nullptr;
     orvan::MpfwSourceFile* lastLoaded_ = nullptr;
     DiagnosticStyle diagnostics_ = DiagnosticStyle::kDefault;
+    std::function<void(const orvan::LexScannerException&)> notes_;
 };
 
 }  // namespace ovmacro_tool

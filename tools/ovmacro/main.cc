@@ -13,11 +13,13 @@
 #include "options.h"
 #include "output_files.h"
 #include "output_runs.h"
+#include "ovmacro/expander/expansion_observer.h"
 #include "ovmacro/expander/nesting_guard.h"
 #include "ovmacro/foundations/files.h"
 #include "ovmacro/python/python_bridge.h"
 #include "source_locator.h"
 #include "source_map.h"
+#include "watcher.h"
 
 using namespace orvan;
 using ovmacro_tool::FileHost;
@@ -153,6 +155,10 @@ int Run(int argc, char** argv) {
     MpfwFrame frame(files);
     FileHost host(frame, options.includeDirs);
     host.SetDiagnosticStyle(options.diagnostics);
+    // Warnings, the notes after an error and the trace come from watching the expansion.
+    ovmacro_tool::Watcher watcher(files, options);
+    const ExpansionObserver::Installation watching(watcher, watcher.WatchesCalls());
+    host.SetNotesWriter([&watcher](const LexScannerException& e) { watcher.WriteNotes(e); });
     if (options.restricted) host.Restrict(options.inputPath, options.maxOutput);
     // The map from the expansion back to the sources serves the settings (their errors), line markers and
     // source maps; without them it is not kept.
@@ -192,6 +198,11 @@ int Run(int argc, char** argv) {
     }
     if (load == FileHost::Load::kFailed) return kExitExpansionError;
     std::fflush(stdout);  // text printed while expanding comes before what follows
+    watcher.ReportUnusedMacros();
+    if (options.warnings.errors && watcher.WarningCount() > 0) {
+        std::fputs("ovmacro: error: warnings are treated as errors (-Werror)\n", stderr);
+        return kExitExpansionError;
+    }
 
     if (options.settings && !host.PrintSettings(xcout())) return kExitExpansionError;
     if (!OutputsAreNotLoaded(outputs, host, error)) {

@@ -95,6 +95,11 @@ constexpr Section kSections[] = {
      "    bad.ovm(2) : Unexpected x after + in expression\n"
      "        expression: 1 + x\n"
      "        passing formal argument n to macro twice\n"
+     "    bad.ovm(1) : note: twice is defined here\n"
+     "\n"
+     "A note follows an error that names a macro (where it is defined) or an unknown word close to a name in "
+     "scope (did you mean that name, and where it is defined). A warning is FILE(LINE) : warning: TEXT "
+     "[-WNAME]; see -W.\n"
      "\n"
      "With --diagnostics=gnu the first line is FILE:LINE:COLUMN: error: MESSAGE, then come the source line "
      "and a caret under the column, then the context lines; an error at a place in no file is reported as "
@@ -105,11 +110,14 @@ constexpr Section kSections[] = {
      "              ^\n"
      "        expression: 1 + x\n"
      "        passing formal argument n to macro twice\n"
+     "    bad.ovm:1:10: note: twice is defined here\n"
+     "    @def int twice(int n) = {n * 2}\n"
+     "             ^\n"
      "\n"
      "A usage error is reported as ovmacro: MESSAGE, followed by Try 'ovmacro --help'."},
     {"EXIT STATUS", "Exit status",
      "0 on success; 1 when the expansion or the settings fail (the error is reported on standard error) or "
-     "--check finds OUT different or missing; 2 on a usage error, an unreadable FILE or an output that "
+     "--check finds OUT different or missing, or -Werror meets a warning; 2 on a usage error, an unreadable FILE or an output that "
      "cannot be written."},
     {"EXAMPLES", nullptr,
      "Generate a header and a dependency file for the build, with a definition and an import folder:\n"
@@ -185,16 +193,22 @@ void AppendHelpSection(std::string& out, const Section& section) {
     });
 }
 
-// "-o, --output=OUT" or "    --deps=DEPFILE", as --help shows an option; roff marks the manual page's form.
+// "-o, --output=OUT", "    --deps=DEPFILE", "    --trace[=NAME,...]" or "-WNAME", as --help shows an
+// option; roff marks the manual page's form.
 std::string OptionForms(const OptionSpec& spec, bool roff) {
     auto bold = [&](const std::string& s) { return roff ? "\\fB" + s + "\\fR" : s; };
     const std::string dash = roff ? "\\-" : "-";
     std::string forms;
+    const std::string name = spec.valueName ? spec.valueName : "";
+    const std::string value = roff && !name.empty() ? "\\fI" + name + "\\fR" : name;
+    if (!spec.longName) {  // -WNAME
+        forms = bold(dash + spec.shortName) + value;
+        return roff ? forms : "  " + forms;
+    }
     if (spec.shortName) forms = bold(dash + spec.shortName) + ", ";
     else if (!roff) forms = "    ";
     forms += bold(dash + dash + std::string(spec.longName));
-    const std::string value = spec.valueName ? spec.valueName : "";
-    if (!value.empty()) forms += "=" + (roff ? "\\fI" + value + "\\fR" : value);
+    if (!value.empty()) forms += spec.optionalValue ? "[=" + value + "]" : "=" + value;
     return roff ? forms : "  " + forms;
 }
 

@@ -62,6 +62,37 @@ bool OtherOutputPath(const char* option, const std::string& value, std::string& 
     return true;
 }
 
+constexpr const char* kWarningNames[kWarningCount] = {"unknown-directive", "unused-macro", "unused-argument",
+                                                      "shadow"};
+
+// all, error, NAME or no-NAME (of -Wall, -Werror, -WNAME, -Wno-NAME); false for a name that is no warning.
+bool ParseWarningSwitch(std::string_view name, WarningSwitches& switches) {
+    if (name == "all" || name == "error") {
+        (name == "all" ? switches.all : switches.errors) = true;
+        return true;
+    }
+    const bool on = name.substr(0, 3) != "no-";
+    if (!on) name.remove_prefix(3);
+    for (int w = 0; w < kWarningCount; ++w)
+        if (name == kWarningNames[w]) {
+            switches.named[w] = on ? 1 : 0;
+            return true;
+        }
+    return false;
+}
+
+// --trace=NAME,...: the names, none of them empty.
+bool ParseTraceNames(std::string_view list, std::vector<std::string>& names) {
+    for (size_t from = 0;;) {
+        const size_t comma = list.find(',', from);
+        const std::string_view name = list.substr(from, comma == std::string_view::npos ? comma : comma - from);
+        if (name.empty()) return false;
+        names.emplace_back(name);
+        if (comma == std::string_view::npos) return true;
+        from = comma + 1;
+    }
+}
+
 // Rows in the order of --help; each names its option once, with its help text and what it records.
 constexpr OptionSpec kOptions[] = {
     {"output", 'o', "OUT",
@@ -139,6 +170,30 @@ constexpr OptionSpec kOptions[] = {
      "a short unified diff when different or when OUT is missing; writes no file, so --deps and --source-map "
      "cannot be used with it",
      [](Options& o, const std::string&, std::string&) { return o.check = true; }},
+    {nullptr, 'W', "NAME",
+     "turn on the warning NAME, or off with -Wno-NAME, whatever the place of -Wall; -Wall turns on every "
+     "warning, -Werror makes warnings fail the run (exit 1, nothing written). Each warning names its switch, "
+     "as [-Wunused-macro]: unknown-directive, a word after @ that is no directive but close to one, as @deff "
+     "or @esle (on by default); unused-macro, a macro defined in the expanded files (not by -D) that is never "
+     "invoked; unused-argument, an argument that its macro's body never names (not reported for names that "
+     "begin with _); shadow, a definition that hides one of the same name in an enclosing scope",
+     [](Options& o, const std::string& v, std::string& error) {
+         if (ParseWarningSwitch(v, o.warnings)) return true;
+         error = "unknown warning option -W" + v;
+         return false;
+     }},
+    {"trace", 0, "NAME,...",
+     "report each macro call (or only the calls of the macros named) on standard error as it happens: its "
+     "place, its arguments (typed ones as values) and its result, indented by nesting; the blocks that @if, "
+     "@elseif, @else, @for and @while expand appear under those names (--trace=@for; @if names a whole "
+     "chain), Python macros as \"python NAME\"",
+     [](Options& o, const std::string& v, std::string& error) {
+         o.trace = true;
+         if (v.empty() || ParseTraceNames(std::string_view(v).substr(1), o.traceNames)) return true;
+         error = "--trace= needs macro names, separated by commas";
+         return false;
+     },
+     true},
     {"help", 'h', nullptr, "show this text and exit",
      [](Options& o, const std::string&, std::string&) { return o.help = true; }},
     {"version", 0, nullptr, "show the version and exit",
@@ -150,6 +205,7 @@ constexpr OptionSpec kOptions[] = {
 const OptionSpec* FindLongOption(std::string_view name, std::string& error) {
     std::vector<const OptionSpec*> found;
     for (const OptionSpec& spec : kOptions) {
+        if (!spec.longName) continue;
         if (name == spec.longName) return &spec;
         if (!name.empty() && std::string_view(spec.longName).starts_with(name)) found.push_back(&spec);
     }
@@ -196,6 +252,13 @@ bool CheckCombinations(Options& options, std::string& error) {
 
 }  // namespace
 
+const char* WarningName(Warning w) { return kWarningNames[static_cast<int>(w)]; }
+
+bool WarningSwitches::On(Warning w) const {
+    const signed char set = named[static_cast<int>(w)];
+    return set >= 0 ? set == 1 : all || w == Warning::kUnknownDirective;
+}
+
 std::span<const OptionSpec> OptionTable() { return kOptions; }
 
 bool ParseOptions(int argc, char** argv, Options& options, std::string& error) {
@@ -233,8 +296,8 @@ bool ParseOptions(int argc, char** argv, Options& options, std::string& error) {
                     error = "option " + option + " takes no value";
                     return false;
                 }
-                value = std::string(arg.substr(eq + 1));
-            } else if (spec->valueName && !nextValue(option, value)) {
+                value = std::string(arg.substr(eq + (spec->optionalValue ? 0 : 1)));
+            } else if (spec->valueName && !spec->optionalValue && !nextValue(option, value)) {
                 return false;
             }
             if (!spec->apply(options, value, error)) return false;

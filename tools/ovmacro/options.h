@@ -10,6 +10,19 @@
 
 namespace ovmacro_tool {
 
+// The warnings, each with its switch -WNAME (see WarningName).
+enum class Warning { kUnknownDirective, kUnusedMacro, kUnusedArgument, kShadow };
+inline constexpr int kWarningCount = 4;
+const char* WarningName(Warning w);
+
+// -Wall, -WNAME, -Wno-NAME and -Werror. A switch that names a warning wins over -Wall, whatever their order.
+struct WarningSwitches {
+    signed char named[kWarningCount] = {-1, -1, -1, -1};  // 1: -WNAME, 0: -Wno-NAME, -1: neither
+    bool all = false;                                     // -Wall
+    bool errors = false;                                  // -Werror: warnings fail the run
+    bool On(Warning w) const;
+};
+
 struct Options {
     std::string inputPath = "-";  // "-" is standard input
     std::string outputPath;       // empty: standard output
@@ -25,6 +38,9 @@ struct Options {
     bool restricted = false;   // --restricted: for templates one did not write (see --help)
     long long maxOutput = 0;   // --max-output: the bound on what an expansion produces, in bytes
     DiagnosticStyle diagnostics = DiagnosticStyle::kDefault;  // --diagnostics: the form of error reports
+    WarningSwitches warnings;                                 // -W...
+    bool trace = false;                                       // --trace: report macro calls as they happen
+    std::vector<std::string> traceNames;                      // --trace=NAME,...: only these; empty: all
     bool help = false;
     bool version = false;
 };
@@ -36,13 +52,14 @@ inline constexpr long long kRestrictedMaxOutput = 64LL << 20;
 // One option: its names, whether it takes a value, its help text and what it records. The table of them is
 // the one place that lists the options: the parser, --help and the manual page all read it.
 struct OptionSpec {
-    const char* longName;   // "output" for --output
+    const char* longName;   // "output" for --output; null for a short option alone (-WNAME)
     char shortName;         // 'o' for -o; 0 for none
     const char* valueName;  // the value as --help names it ("OUT"); null for an option without a value
     const char* help;       // one paragraph, which --help and the manual page wrap
-    // Records the option and its value (empty for an option without one); false, with error set, on a bad
-    // value.
+    // Records the option and its value (empty for an option without one; for an optional value, "=VALUE"
+    // when given, so that "--trace=" differs from "--trace"); false, with error set, on a bad value.
     bool (*apply)(Options& options, const std::string& value, std::string& error);
+    bool optionalValue = false;  // a long option whose value only comes after '=' (--trace[=NAME,...])
 };
 
 // Every option, in the order --help lists them.

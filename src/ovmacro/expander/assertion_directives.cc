@@ -45,7 +45,8 @@ void MacroExpander::ProcessAssertDirective() {
         MacroExpand(nullptr, &child, condition, 0, 0, expanded);
     }
     bool holds = false;
-    ParseDirectiveText(expanded, "@assert", currentToken.begin(), [&](ExpressionParser& p) { holds = p.ParseBool(false); });
+    ParseDirectiveText(frame, expanded, "@assert", currentToken.begin(),
+                       [&](ExpressionParser& p) { holds = p.ParseBool(false); });
     if (!holds)
         throw LexScannerException(
             Compose("Assertion failure\n        @assert(", condition, ")\nie      @assert(", expanded, ")"),

@@ -1,6 +1,7 @@
 // @def, @exportdef, @nakeddef and @defpython: reading a macro definition and storing it in its frame.
 #include <memory>
 
+#include "ovmacro/expander/expansion_observer.h"
 #include "ovmacro/expander/macro_expander.h"
 #include "ovmacro/foundations/compose.h"
 #include "ovmacro/lexer/section_scanners.h"
@@ -30,7 +31,9 @@ void MacroExpander::ProcessDefDirective(bool exported, bool naked, bool python) 
         target = frame->GetParent();
         if (!target) throw LexScannerException("No parent frame", token);
     }
-    target->AddVariable(macro.release());
+    LSMacroVariable* const defined = macro.release();
+    target->AddVariable(defined);
+    if (ExpansionObserver* observer = ExpansionObserver::Current()) observer->MacroDefined(*defined, *target);
     ScanOverWhiteSpaceAfterDirective();
 }
 

@@ -1,11 +1,12 @@
 #include "ovmacro/expander/directive_text.h"
 
+#include "ovmacro/expander/expansion_observer.h"
 #include "ovmacro/expander/macro_expander.h"
 #include "ovmacro/foundations/compose.h"
 
 namespace orvan {
 
-void ParseDirectiveText(const basic_xstring& expanded, BasicSubString name, const char* at,
+void ParseDirectiveText(VarFrame* frame, const basic_xstring& expanded, BasicSubString name, const char* at,
                         const std::function<void(ExpressionParser&)>& parse) {
     try {
         ExpressionParser parser;
@@ -18,6 +19,8 @@ void ParseDirectiveText(const basic_xstring& expanded, BasicSubString name, cons
                                               parser.Named(parser.GetToken()), " in expression"),
                                       parser.GetToken());
     } catch (LexScannerException& e) {
+        if (ExpansionObserver* observer = ExpansionObserver::Current())
+            observer->ExpressionFailed(frame, BasicSubString(expanded), e);
         e.AppendContextLine(Compose("\n    in ", name, "(", expanded, ")"));
         e.SetPosition(at);
         throw;
@@ -35,7 +38,7 @@ bool EvaluateConditionText(VarFrame* frame, BasicSubString condition, BasicSubSt
         throw;
     }
     bool value = false;
-    ParseDirectiveText(expanded, name, at, [&](ExpressionParser& p) { value = p.ParseBool(false); });
+    ParseDirectiveText(frame, expanded, name, at, [&](ExpressionParser& p) { value = p.ParseBool(false); });
     return value;
 }
 

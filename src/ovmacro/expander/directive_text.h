@@ -9,12 +9,12 @@
 
 namespace orvan {
 
-// Parses `expanded`, the expansion of the bracketed text of the directive `name` whose '@' is at `at`, with
-// `parse`, which must read all of it: a token left over raises "Expected ) after ... when read ...". The
-// messages name the token before the first "(" and the end of the text ")", the brackets the user wrote; an
-// error gets "\n    in NAME(expanded)" and moves to the directive, since the expanded text has no place in the
-// source.
-void ParseDirectiveText(const basic_xstring& expanded, BasicSubString name, const char* at,
+// Parses `expanded`, the expansion in `frame` of the bracketed text of the directive `name` whose '@' is at
+// `at`, with `parse`, which must read all of it: a token left over raises "Expected ) after ... when read
+// ...". The messages name the token before the first "(" and the end of the text ")", the brackets the user
+// wrote; an error gets "\n    in NAME(expanded)" and moves to the directive, since the expanded text has no
+// place in the source.
+void ParseDirectiveText(VarFrame* frame, const basic_xstring& expanded, BasicSubString name, const char* at,
                         const std::function<void(ExpressionParser&)>& parse);
 
 // Expands `condition` in a child frame of `frame` and evaluates it as a bool with ParseDirectiveText. An error

@@ -1,4 +1,5 @@
 // The main loop of the expander: copies ordinary text, finds macro names and dispatches @-directives.
+#include "ovmacro/expander/expansion_observer.h"
 #include "ovmacro/expander/held_text.h"
 #include "ovmacro/expander/macro_expander.h"
 #include "ovmacro/expander/nesting_guard.h"
@@ -246,7 +247,11 @@ void MacroExpander::ProcessValueVariableDirective(const LSToken& word, const cha
         v = frame->Find2(BasicSubString(joined));
     }
     auto* value = dynamic_cast<LSValueVariable*>(v);
-    if (!value) return;
+    if (!value) {
+        if (ExpansionObserver* observer = ExpansionObserver::Current())
+            observer->NotADirective(word.text, start);
+        return;
+    }
     AdvanceWritePos(start, true);
     WriteCalculatedSubString(BasicSubString(value->value));
     AdvanceWritePos(cursor.begin(), false);

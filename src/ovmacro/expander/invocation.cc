@@ -8,6 +8,7 @@
 #include "ovmacro/expander/call_context.h"
 #include "ovmacro/expander/held_text.h"
 #include "ovmacro/expander/directive_text.h"
+#include "ovmacro/expander/expansion_observer.h"
 #include "ovmacro/expander/macro_expander.h"
 #include "ovmacro/expander/nesting_guard.h"
 #include "ovmacro/expander/plain_text.h"
@@ -73,6 +74,7 @@ void MacroExpander::InvokeVariable(LSVariable* v) {
     // Macros rarely take more than a few arguments: their texts and bindings then need no allocation.
     constexpr size_t kInlineArgs = 4;
     SmallBuffer<BasicSubString, kInlineArgs> actual(static_cast<size_t>(n));
+    const ObservedExpansion observed(*m, currentToken, actual, output);
     const bool nameArguments = n > 0 && ReadNameArguments(cursor, {actual.data(), actual.size()});
     if (n > 0 && !nameArguments) {
         const LSToken open = ReadToken();
@@ -127,6 +129,7 @@ void MacroExpander::InvokeVariable(LSVariable* v) {
         bodyFrame->AddVariable(binding);
         bound[static_cast<size_t>(i)] = binding;
     }
+    observed.Bound(bound.view());
 
     const BasicSubString body = m->GetSubstitutionString();
     if (m->IsPython()) {
@@ -222,6 +225,8 @@ void ReadVariableValueByParsingExpression(VarFrame* frame, BasicSubString text, 
             throw LexScannerException(Compose("Read ", parser.GetToken(), " in middle of expression"), parser.GetToken());
         value.swap(result);
     } catch (LexScannerException& e) {
+        if (ExpansionObserver* observer = ExpansionObserver::Current())
+            observer->ExpressionFailed(frame, BasicSubString(expanded), e);
         e.AppendContextLine(Compose("\n    expression: ", expanded));
         // The error points into the expanded text, which dies here: it moves back to the source character
         // that produced the faulty text.
@@ -240,7 +245,7 @@ basic_xstring MacroExpander::EvaluateString(BasicSubString sectionText, BasicSub
         throw;
     }
     basic_xstring result;
-    ParseDirectiveText(expanded, directiveName, currentToken.begin(),
+    ParseDirectiveText(frame, expanded, directiveName, currentToken.begin(),
                        [&](ExpressionParser& p) { result = p.ParseString(false); });
     return result;
 }

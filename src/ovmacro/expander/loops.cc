@@ -2,6 +2,7 @@
 #include <algorithm>
 
 #include "ovmacro/expander/directive_text.h"
+#include "ovmacro/expander/expansion_observer.h"
 #include "ovmacro/expander/held_text.h"
 #include "ovmacro/expander/macro_expander.h"
 #include "ovmacro/expander/nesting_guard.h"
@@ -26,6 +27,7 @@ void BindLoopName(VarFrame& iterationFrame, VarFrame* loopFrame, BasicSubString 
 }  // namespace
 
 BasicSubString MacroExpander::OrdinaryListText(BasicSubString listText) {
+    if (ExpansionObserver::CallWatcher()) return {};  // which sees the list's macro invoked
     if (std::find(listText.begin(), listText.end(), '\n') != listText.end()) return {};
     BasicSubString rest = listText;
     ScanWhiteSpace(rest);
@@ -107,7 +109,9 @@ void MacroExpander::ProcessForDirective() {
     if (names.empty()) names.push_back(singleName);
     // A block of ordinary text, loop names and @str of them is cut once and written item by item.
     LoopBlockPlan plan;
-    const bool planned = PlanLoopBlock(block, indent, names, frame, plan);
+    // A tool that watches calls sees each loop name invoked: the general way, which invokes them.
+    const bool planned =
+        !ExpansionObserver::CallWatcher() && PlanLoopBlock(block, indent, names, frame, plan);
     const bool dollarMacrosActive = planned && DollarMacrosActive(frame);
     xvector<BasicSubString> values(names.size());
     for (;;) {
@@ -148,6 +152,7 @@ void MacroExpander::ProcessForDirective() {
                     (part.kind == LoopBlockPart::kName || !values[part.name].empty()));
         });
         try {
+            const ObservedExpansion observed("@for", currentToken, singleName, item, *output);
             if (plain) {
                 WritePlannedIteration(plan, values, block, blockOutputIndent);
             } else {
@@ -181,6 +186,7 @@ void MacroExpander::ProcessWhileDirective() {
     while (EvaluateConditionText(frame, condition, "@while", currentToken.begin())) {
         if (block.empty()) continue;
         VarFrame iterationFrame(frame);
+        const ObservedExpansion observed("@while", currentToken, BasicSubString(), condition, *output);
         MacroExpand(nullptr, &iterationFrame, block, indent, blockOutputIndent, *output);
     }
 }

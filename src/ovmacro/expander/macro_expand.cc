@@ -1,6 +1,7 @@
 // The library's entry points: expand a text into an output, or into a string with or without its pieces.
 #include <new>
 
+#include "ovmacro/expander/expansion_observer.h"
 #include "ovmacro/expander/held_text.h"
 #include "ovmacro/expander/macro_expander.h"
 #include "ovmacro/expander/nesting_guard.h"
@@ -24,6 +25,7 @@ void MacroExpand(ImportHandler* importHandler, VarFrame* frame, BasicSubString t
         output.Flush();  // the caller finds the whole expansion in its stream
     } catch (LexScannerException& e) {
         output.Flush();  // what was written before the failure stays written
+        if (ExpansionObserver* observer = ExpansionObserver::Current()) observer->ExpansionFailed(frame, e);
         // A position in a text that an expansion made (and that still lives) means nothing to a host: it
         // moves to the source. At every level, since a host may report the errors of a nested expansion.
         MovePositionOutOfHeldTexts(e);

@@ -5,6 +5,7 @@
 
 #include "ovmacro/expander/held_text.h"
 #include "ovmacro/expander/directive_text.h"
+#include "ovmacro/expander/expansion_observer.h"
 #include "ovmacro/expander/macro_expander.h"
 #include "ovmacro/expander/nesting_guard.h"
 #include "ovmacro/expander/plain_text.h"
@@ -62,7 +63,7 @@ void MacroExpander::ProcessStrDirective(bool isX, EStrLiteralMode mode) {
     BasicSubString expanded;
     basic_xstring storage;
     BasicSubString name = argument;
-    if (ScanIdentifier(name) && name.empty()) {
+    if (ScanIdentifier(name) && name.empty() && !ExpansionObserver::CallWatcher()) {
         const BasicSubString word(argument.begin(), name.begin());
         expanded = OrdinaryValueOfName(FindVariable(word), frame);
         if (!expanded.empty()) {
@@ -145,7 +146,8 @@ void MacroExpander::ProcessRndBracketDirective() {
     const basic_xstring expanded = ExpandInChildFrame(frame, section, 0);
     basic_xstring value;
     // Any type is accepted and written as its text.
-    ParseDirectiveText(expanded, "@", currentToken.begin(), [&](ExpressionParser& p) { value = p.ParseString(true); });
+    ParseDirectiveText(frame, expanded, "@", currentToken.begin(),
+                       [&](ExpressionParser& p) { value = p.ParseString(true); });
     WriteCalculatedSubString(BasicSubString(value));
 }
 
