@@ -25,6 +25,18 @@ using HR = HumanReadableCharInSubString;
     throw LexScannerException(message, position);
 }
 
+// The character of a bracket kind.
+char BracketChar(EToken bracket) {
+    switch (bracket) {
+        case TK_LPAREN: return '(';
+        case TK_RPAREN: return ')';
+        case TK_LBRACE: return '{';
+        case TK_RBRACE: return '}';
+        case TK_LBRACKET: return '[';
+        default: return ']';
+    }
+}
+
 // The closing partner of an opening bracket kind, or TK_NONE for any other kind.
 EToken ClosingPartner(EToken open) {
     switch (open) {
@@ -216,13 +228,18 @@ void DecodeQuotedString(BasicSubString s, xostream* os, const char* endName) {
 }
 
 // Skips the tokens of an argument that can neither fail nor open, close or end anything (names, plain
-// integers, quoted literals, operators, the punctuation "#.;~\\`") and the white space between them, and
-// stops before any other, which the token scanner reads. Returns the end of the last token skipped, or null.
-const char* SkipQuietTokens(BasicSubString& s) {
+// integers, quoted literals, operators, the punctuation "#.;~\\`", and inside a group of brackets any
+// comma or bracket but the group's own `open` and `close`) and the white space between them, and stops
+// before any other, which the token scanner reads. Returns the end of the last token skipped, or null.
+const char* SkipQuietTokens(BasicSubString& s, char open, char close) {
     const char* p = s.begin();
     const char* const end = s.end();
     const char* last = nullptr;
     while (p < end) {
+        if (*p == ' ') {  // the commonest byte between tokens
+            ++p;
+            continue;
+        }
         switch (ClassOf(*p)) {
             case CharClass::kWhiteSpace:
             case CharClass::kLineFeed: ++p; continue;
@@ -239,7 +256,9 @@ const char* SkipQuietTokens(BasicSubString& s) {
                 break;
             case CharClass::kOperator: last = ++p; continue;
             case CharClass::kSingle:
-                if (*p == ',' || *p == '(' || *p == ')' || *p == '[' || *p == ']' || *p == '{' || *p == '}') break;
+                if (open ? *p == open || *p == close
+                         : *p == ',' || *p == '(' || *p == ')' || *p == '[' || *p == ']' || *p == '{' || *p == '}')
+                    break;
                 last = ++p;
                 continue;
             case CharClass::kSingleQuote:
@@ -302,7 +321,11 @@ LSToken ScanArgumentIn(BasicSubString& s, BasicSubString& arg, EToken terminator
     for (;;) {
         arg.SetEnd(s.begin());
         if (skipQuietTokens) {
-            if (const char* quietEnd = SkipQuietTokens(s)) arg.SetEnd(quietEnd);
+            // Inside a group only its own brackets count, unless their ends are being recorded.
+            const bool grouped = depth > 0 && !recording;
+            const char open = grouped ? BracketChar(trackedOpen) : '\0';
+            if (const char* quietEnd = SkipQuietTokens(s, open, grouped ? BracketChar(trackedClose) : '\0'))
+                arg.SetEnd(quietEnd);
         }
         const LSToken t = LsScanToken(s, false);
         if (t.type == TK_EOS) {
