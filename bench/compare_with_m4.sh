@@ -39,6 +39,7 @@
 # removed and the file system synced (outside the timing), so that neither tool pays for writing back or
 # freeing what the other wrote.
 set -euo pipefail
+export LC_ALL=C  # EPOCHREALTIME with a decimal point
 cd "$(dirname "$0")/.."
 runs=${RUNS:-7}
 
@@ -164,20 +165,35 @@ printf '@def X = {1}\nX\n' >"$work/start.ovm"
 printf 'm4_define(`X'"'"', `1'"'"')m4_dnl\nX\n' >"$work/start.m4"
 
 # run OUTPUT_FILE COMMAND...: runs once with output to the file; sets wall and cpu (user + system) in seconds,
-# and rss (KB). CPU time says more than wall time on a machine that other work shares.
+# read by the shell itself (EPOCHREALTIME, times), so that a wrapper's start adds nothing to short runs. CPU time
+# says more than wall time on a machine that other work shares.
 run() {
   local out=$1
   shift
-  local start end
-  start=$(date +%s%N)
-  /usr/bin/time -f '%e %M %U %S' -o "$work/time" "$@" >"$out" || {
+  times >"$work/times.before"
+  local start=$EPOCHREALTIME
+  "$@" >"$out" || {
     echo "compare_with_m4: failed: $*" >&2
     exit 1
   }
-  end=$(date +%s%N)
-  wall=$(awk -v ns=$((end - start)) 'BEGIN { printf "%.4f", ns / 1e9 }')
-  rss=$(awk 'END { print $2 }' "$work/time")
-  cpu=$(awk 'END { printf "%.2f", $3 + $4 }' "$work/time")
+  local end=$EPOCHREALTIME
+  times >"$work/times.after"
+  wall=$(awk -v a="$start" -v b="$end" 'BEGIN { printf "%.4f", b - a }')
+  # The second line of times: the children's user and system times, as 0m1.234s.
+  cpu=$(awk 'function s(t) { split(t, p, "m"); return p[1] * 60 + p[2] }
+             FNR == 2 { c[FILENAME] = s($1) + s($2) } END { printf "%.3f", c[ARGV[2]] - c[ARGV[1]] }' \
+    "$work/times.before" "$work/times.after")
+}
+
+# peak_rss OUTPUT_FILE COMMAND...: one more run, under /usr/bin/time; sets rss (KB).
+peak_rss() {
+  local out=$1
+  shift
+  /usr/bin/time -f '%M' -o "$work/time" "$@" >"$out" || {
+    echo "compare_with_m4: failed: $*" >&2
+    exit 1
+  }
+  rss=$(tail -n 1 "$work/time")
 }
 
 # fresh FILE...: removes the files and writes back whatever waits to be written, before a timed run.
@@ -194,9 +210,12 @@ printf '\n%-13s %-8s %8s %8s %18s %12s\n' workload tool 'wall s' 'cpu s' 'throug
 bench() {
   local name=$1 label=$2 units=$3 unit=$4 i input_bytes
   input_bytes=$(stat -c %s "$work/$name.ovm")
-  local -a ov_wall=() m4_wall=() ov_cpu=() m4_cpu=() ov_rss=() m4_rss=()
-  run /dev/null "$ovmacro" -o "$work/$name.ovmacro.out" "$work/$name.ovm"
-  run "$work/$name.m4.out" m4 -P -I "$work" "$work/$name.m4"
+  local -a ov_wall=() m4_wall=() ov_cpu=() m4_cpu=()
+  local ovr m4r
+  peak_rss /dev/null "$ovmacro" -o "$work/$name.ovmacro.out" "$work/$name.ovm"
+  ovr=$rss
+  peak_rss "$work/$name.m4.out" m4 -P -I "$work" "$work/$name.m4"
+  m4r=$rss
   cmp -s "$work/$name.ovmacro.out" "$work/$name.m4.out" || {
     echo "compare_with_m4: $name: the outputs of ovmacro and m4 differ" >&2
     diff "$work/$name.ovmacro.out" "$work/$name.m4.out" | head -n 10 >&2
@@ -205,18 +224,16 @@ bench() {
   for ((i = 0; i < runs; i++)); do
     fresh "$work/$name.ovmacro.out"
     run /dev/null "$ovmacro" -o "$work/$name.ovmacro.out" "$work/$name.ovm"
-    ov_wall+=("$wall") ov_cpu+=("$cpu") ov_rss+=("$rss")
+    ov_wall+=("$wall") ov_cpu+=("$cpu")
     fresh "$work/$name.m4.out"
     run "$work/$name.m4.out" m4 -P -I "$work" "$work/$name.m4"
-    m4_wall+=("$wall") m4_cpu+=("$cpu") m4_rss+=("$rss")
+    m4_wall+=("$wall") m4_cpu+=("$cpu")
   done
-  local ovw m4w ovc m4c ovr m4r
+  local ovw m4w ovc m4c
   ovw=$(printf '%s\n' "${ov_wall[@]}" | median)
   m4w=$(printf '%s\n' "${m4_wall[@]}" | median)
   ovc=$(printf '%s\n' "${ov_cpu[@]}" | median)
   m4c=$(printf '%s\n' "${m4_cpu[@]}" | median)
-  ovr=$(printf '%s\n' "${ov_rss[@]}" | sort -n | tail -n 1)
-  m4r=$(printf '%s\n' "${m4_rss[@]}" | sort -n | tail -n 1)
   awk -v name="$label" -v units="$units" -v unit="$unit" -v ovw="$ovw" -v m4w="$m4w" -v ovc="$ovc" -v m4c="$m4c" \
     -v ovr="$ovr" -v m4r="$m4r" -v bytes="$input_bytes" '
     function rate(t) { return unit == "MB" ? sprintf("%.1f MB/s", units / 1e6 / t) : sprintf("%.0f %s/s", units / t, unit) }
@@ -284,20 +301,25 @@ sizes() {
     for ((copies = 0; copies < mult; copies++)); do cat "$work/plain.ovm" >>"$work/big.ovm"; done
     local bytes
     bytes=$(stat -c %s "$work/big.ovm")
-    local -a ow=() oc=() orss=() mw=() mc=() mrss=()
+    local -a ow=() oc=() mw=() mc=()
+    local orss mrss
+    peak_rss /dev/null "$ovmacro" -o "$work/big.ovmacro.out" "$work/big.ovm"
+    orss=$rss
+    peak_rss "$work/big.m4.out" m4 -P "$work/big.ovm"
+    mrss=$rss
     for ((i = 0; i < 3; i++)); do
       fresh "$work/big.ovmacro.out"
       run /dev/null "$ovmacro" -o "$work/big.ovmacro.out" "$work/big.ovm"
-      ow+=("$wall") oc+=("$cpu") orss+=("$rss")
+      ow+=("$wall") oc+=("$cpu")
       fresh "$work/big.m4.out"
       run "$work/big.m4.out" m4 -P "$work/big.ovm"
-      mw+=("$wall") mc+=("$cpu") mrss+=("$rss")
+      mw+=("$wall") mc+=("$cpu")
     done
     cmp -s "$work/big.ovm" "$work/big.ovmacro.out" || { echo "compare_with_m4: plain text changed" >&2; exit 1; }
     awk -v mb=$((bytes / 1000000)) -v bytes="$bytes" -v ow="$(printf '%s\n' "${ow[@]}" | median)" \
-      -v oc="$(printf '%s\n' "${oc[@]}" | median)" -v orss="$(printf '%s\n' "${orss[@]}" | sort -n | tail -n 1)" \
+      -v oc="$(printf '%s\n' "${oc[@]}" | median)" -v orss="$orss" \
       -v mw="$(printf '%s\n' "${mw[@]}" | median)" -v mc="$(printf '%s\n' "${mc[@]}" | median)" \
-      -v mrss="$(printf '%s\n' "${mrss[@]}" | sort -n | tail -n 1)" 'BEGIN {
+      -v mrss="$mrss" 'BEGIN {
       printf "%-13s %-8s %8.3f %8.2f %12.1f %13.2fx\n", mb " MB", "ovmacro", ow, oc, orss / 1024, orss * 1024 / bytes
       printf "%-13s %-8s %8.3f %8.2f %12.1f %13.2fx\n", "", "m4", mw, mc, mrss / 1024, mrss * 1024 / bytes
     }'
@@ -308,7 +330,7 @@ sizes() {
 sizes
 
 echo
-echo "median of $runs alternating runs per tool; peak RSS is the largest of those runs; speed-up = m4 time / ovmacro"
+echo "median of $runs alternating runs per tool; peak RSS of one more run; speed-up = m4 time / ovmacro time"
 echo "time (wall and cpu = user + system); memory = ovmacro's peak RSS / its input's size;"
 echo "outputs of the two tools were identical for every workload; ovmacro $("$ovmacro" --version | awk '{ print $2 }'), $(m4 --version | head -n 1)"
 echo
