@@ -25,9 +25,21 @@
 #                 step and take quadratic time;
 #   conditionals  200,000 loop-free lines: per group of four, a bool variable set, an int counter advanced,
 #                 a conditional on the bool that writes a string variable and the counter, and a plain line.
-#                 ovmacro uses @let and @if(flag){...}@else{...}; m4 uses m4_define, m4_incr and m4_ifelse.
-# Each tool runs RUNS times, alternating with the other (after one untimed run each), with output to a file.
+#                 ovmacro uses @let and @if(flag){...}@else{...}; m4 uses m4_define, m4_incr and m4_ifelse;
+#   table         one list of 20,000 (identifier, display name) tuples made into an enum and a table of string
+#                 literals: ovmacro with two @for((id, name) in ENTRIES) blocks, the second writing @str(name);
+#                 m4 the m4 way, a file of ENTRY(id, name) lines included twice under two definitions of ENTRY;
+#   start-up      a two-line template (one definition, one use), run STARTS times in a row per sample, in
+#                 STARTUP_PAIRS alternating samples (defaults 20 and 31): the wall time per run, and the page
+#                 faults of one run;
+#   plain sizes   the plain text at 40, 80, 160 and 200 MB (the 40 MB text repeated): wall time, peak RSS,
+#                 and how the time grows with the size (3 alternating runs each).
+# Each tool runs RUNS times, alternating with the other (after one untimed run each). ovmacro writes its
+# output with -o, m4 to its standard output, each into a new file: before each timed run the previous output is
+# removed and the file system synced (outside the timing), so that neither tool pays for writing back or
+# freeing what the other wrote.
 set -euo pipefail
+export LC_ALL=C  # EPOCHREALTIME with a decimal point
 cd "$(dirname "$0")/.."
 runs=${RUNS:-7}
 
@@ -121,21 +133,73 @@ awk -v groups="$groups" -v q="'" 'BEGIN {
   }
 }' >"$work/cond.m4"
 
+entries=20000
+awk -v n="$entries" 'BEGIN {
+  printf "@def ENTRIES = ["
+  for (i = 0; i < n; i++) printf "%s(E%d, `name %d \"q\"`)", i ? ", " : "", i, i
+  print "]"
+  print "enum class Color {"
+  print "    @for((id, name) in ENTRIES)"; print "    {"; print "        id,"; print ""; print "    }@//"
+  print "};"
+  print "static const char* const kNames[] = {"
+  print "    @for((id, name) in ENTRIES)"; print "    {"; print "        @str(name),"; print ""; print "    }@//"
+  print "};"
+}' >"$work/table.ovm"
+awk -v n="$entries" -v q="'" 'BEGIN {
+  for (i = 0; i < n; i++) printf "ENTRY(E%d, `name %d \\\"q\\\"%s)m4_dnl\n", i, i, q
+}' >"$work/entries.m4"
+cat >"$work/table.m4" <<'EOF'
+enum class Color {
+m4_define(`ENTRY', `    $1,
+')m4_dnl
+m4_include(`entries.m4')m4_dnl
+};
+static const char* const kNames[] = {
+m4_define(`ENTRY', `    "$2",
+')m4_dnl
+m4_include(`entries.m4')m4_dnl
+};
+EOF
+
+printf '@def X = {1}\nX\n' >"$work/start.ovm"
+printf 'm4_define(`X'"'"', `1'"'"')m4_dnl\nX\n' >"$work/start.m4"
+
 # run OUTPUT_FILE COMMAND...: runs once with output to the file; sets wall and cpu (user + system) in seconds,
-# and rss (KB). CPU time says more than wall time on a machine that other work shares.
+# read by the shell itself (EPOCHREALTIME, times), so that a wrapper's start adds nothing to short runs. CPU time
+# says more than wall time on a machine that other work shares.
 run() {
   local out=$1
   shift
-  local start end
-  start=$(date +%s%N)
-  /usr/bin/time -f '%e %M %U %S' -o "$work/time" "$@" >"$out" || {
+  times >"$work/times.before"
+  local start=$EPOCHREALTIME
+  "$@" >"$out" || {
     echo "compare_with_m4: failed: $*" >&2
     exit 1
   }
-  end=$(date +%s%N)
-  wall=$(awk -v ns=$((end - start)) 'BEGIN { printf "%.4f", ns / 1e9 }')
-  rss=$(awk 'END { print $2 }' "$work/time")
-  cpu=$(awk 'END { printf "%.2f", $3 + $4 }' "$work/time")
+  local end=$EPOCHREALTIME
+  times >"$work/times.after"
+  wall=$(awk -v a="$start" -v b="$end" 'BEGIN { printf "%.4f", b - a }')
+  # The second line of times: the children's user and system times, as 0m1.234s.
+  cpu=$(awk 'function s(t) { split(t, p, "m"); return p[1] * 60 + p[2] }
+             FNR == 2 { c[FILENAME] = s($1) + s($2) } END { printf "%.3f", c[ARGV[2]] - c[ARGV[1]] }' \
+    "$work/times.before" "$work/times.after")
+}
+
+# peak_rss OUTPUT_FILE COMMAND...: one more run, under /usr/bin/time; sets rss (KB).
+peak_rss() {
+  local out=$1
+  shift
+  /usr/bin/time -f '%M' -o "$work/time" "$@" >"$out" || {
+    echo "compare_with_m4: failed: $*" >&2
+    exit 1
+  }
+  rss=$(tail -n 1 "$work/time")
+}
+
+# fresh FILE...: removes the files and writes back whatever waits to be written, before a timed run.
+fresh() {
+  rm -f "$@"
+  sync
 }
 
 median() { sort -g | awk '{ v[NR] = $1 } END { print (NR % 2) ? v[(NR + 1) / 2] : (v[NR / 2] + v[NR / 2 + 1]) / 2 }'; }
@@ -146,27 +210,30 @@ printf '\n%-13s %-8s %8s %8s %18s %12s\n' workload tool 'wall s' 'cpu s' 'throug
 bench() {
   local name=$1 label=$2 units=$3 unit=$4 i input_bytes
   input_bytes=$(stat -c %s "$work/$name.ovm")
-  local -a ov_wall=() m4_wall=() ov_cpu=() m4_cpu=() ov_rss=() m4_rss=()
-  run "$work/$name.ovmacro.out" "$ovmacro" "$work/$name.ovm"
-  run "$work/$name.m4.out" m4 -P "$work/$name.m4"
+  local -a ov_wall=() m4_wall=() ov_cpu=() m4_cpu=()
+  local ovr m4r
+  peak_rss /dev/null "$ovmacro" -o "$work/$name.ovmacro.out" "$work/$name.ovm"
+  ovr=$rss
+  peak_rss "$work/$name.m4.out" m4 -P -I "$work" "$work/$name.m4"
+  m4r=$rss
   cmp -s "$work/$name.ovmacro.out" "$work/$name.m4.out" || {
     echo "compare_with_m4: $name: the outputs of ovmacro and m4 differ" >&2
     diff "$work/$name.ovmacro.out" "$work/$name.m4.out" | head -n 10 >&2
     exit 1
   }
   for ((i = 0; i < runs; i++)); do
-    run "$work/$name.ovmacro.out" "$ovmacro" "$work/$name.ovm"
-    ov_wall+=("$wall") ov_cpu+=("$cpu") ov_rss+=("$rss")
-    run "$work/$name.m4.out" m4 -P "$work/$name.m4"
-    m4_wall+=("$wall") m4_cpu+=("$cpu") m4_rss+=("$rss")
+    fresh "$work/$name.ovmacro.out"
+    run /dev/null "$ovmacro" -o "$work/$name.ovmacro.out" "$work/$name.ovm"
+    ov_wall+=("$wall") ov_cpu+=("$cpu")
+    fresh "$work/$name.m4.out"
+    run "$work/$name.m4.out" m4 -P -I "$work" "$work/$name.m4"
+    m4_wall+=("$wall") m4_cpu+=("$cpu")
   done
-  local ovw m4w ovc m4c ovr m4r
+  local ovw m4w ovc m4c
   ovw=$(printf '%s\n' "${ov_wall[@]}" | median)
   m4w=$(printf '%s\n' "${m4_wall[@]}" | median)
   ovc=$(printf '%s\n' "${ov_cpu[@]}" | median)
   m4c=$(printf '%s\n' "${m4_cpu[@]}" | median)
-  ovr=$(printf '%s\n' "${ov_rss[@]}" | sort -n | tail -n 1)
-  m4r=$(printf '%s\n' "${m4_rss[@]}" | sort -n | tail -n 1)
   awk -v name="$label" -v units="$units" -v unit="$unit" -v ovw="$ovw" -v m4w="$m4w" -v ovc="$ovc" -v m4c="$m4c" \
     -v ovr="$ovr" -v m4r="$m4r" -v bytes="$input_bytes" '
     function rate(t) { return unit == "MB" ? sprintf("%.1f MB/s", units / 1e6 / t) : sprintf("%.0f %s/s", units / t, unit) }
@@ -185,9 +252,85 @@ bench plaindef 'plain, def' "$plain_bytes" MB
 bench calls 'macro calls' "$calls" calls
 bench loop 'loop' "$items" items
 bench cond 'conditionals' "$lines" lines
+bench table 'table' "$entries" entries
+
+# The start of the process, which a build that generates thousands of small files pays thousands of times:
+# STARTS runs in a row per sample (the clock read once per sample), samples alternating between the tools.
+startup() {
+  local starts=${STARTS:-20} pairs=${STARTUP_PAIRS:-31} i k start end
+  "$ovmacro" -o "$work/start.ovmacro.out" "$work/start.ovm"
+  m4 -P "$work/start.m4" >"$work/start.m4.out"
+  cmp -s "$work/start.ovmacro.out" "$work/start.m4.out" || { echo "compare_with_m4: start-up outputs differ" >&2; exit 1; }
+  local -a ov=() m4t=()
+  for ((i = 0; i < pairs; i++)); do
+    start=$(date +%s%N)
+    for ((k = 0; k < starts; k++)); do "$ovmacro" -o "$work/start.ovmacro.out" "$work/start.ovm"; done
+    end=$(date +%s%N)
+    ov+=("$(((end - start) / starts))")
+    start=$(date +%s%N)
+    for ((k = 0; k < starts; k++)); do m4 -P "$work/start.m4" >"$work/start.m4.out"; done
+    end=$(date +%s%N)
+    m4t+=("$(((end - start) / starts))")
+  done
+  local ovm m4m ovf m4f spread
+  ovm=$(printf '%s\n' "${ov[@]}" | median)
+  m4m=$(printf '%s\n' "${m4t[@]}" | median)
+  ovf=$(/usr/bin/time -f %R "$ovmacro" -o "$work/start.ovmacro.out" "$work/start.ovm" 2>&1)
+  ovf=${ovf##*$'\n'}
+  m4f=$( { /usr/bin/time -f %R m4 -P "$work/start.m4" >/dev/null; } 2>&1)
+  spread=$(printf '%s\n' "${ov[@]}" | sort -n | awk 'NR == 1 { lo = $1 } { hi = $1 } END { printf "%.2f-%.2f", lo / 1e6, hi / 1e6 }')
+  spread="$spread / $(printf '%s\n' "${m4t[@]}" | sort -n | awk 'NR == 1 { lo = $1 } { hi = $1 } END { printf "%.2f-%.2f", lo / 1e6, hi / 1e6 }')"
+  echo
+  printf '%-13s %-8s %12s %12s\n' start-up tool 'ms per run' 'page faults'
+  awk -v ovm="$ovm" -v m4m="$m4m" -v ovf="$ovf" -v m4f="$m4f" -v spread="$spread" 'BEGIN {
+    printf "%-13s %-8s %12.2f %12d\n", "two lines", "ovmacro", ovm / 1e6, ovf
+    printf "%-13s %-8s %12.2f %12d\n", "", "m4", m4m / 1e6, m4f
+    printf "%-13s %-8s %11.2fx %12s\n", "", "speed-up", m4m / ovm, ""
+    printf "%-13s %-8s %12s\n", "", "spread", "ms min-max, ovmacro / m4: " spread
+  }'
+}
+startup
+
+# The plain text at growing sizes: whether the time stays proportional to the input and the memory to it.
+sizes() {
+  local mult i copies
+  echo
+  printf '%-13s %-8s %8s %8s %12s %14s\n' 'plain sizes' tool 'wall s' 'cpu s' 'peak RSS MB' 'RSS / input'
+  for mult in 1 2 4 5; do
+    : >"$work/big.ovm"
+    for ((copies = 0; copies < mult; copies++)); do cat "$work/plain.ovm" >>"$work/big.ovm"; done
+    local bytes
+    bytes=$(stat -c %s "$work/big.ovm")
+    local -a ow=() oc=() mw=() mc=()
+    local orss mrss
+    peak_rss /dev/null "$ovmacro" -o "$work/big.ovmacro.out" "$work/big.ovm"
+    orss=$rss
+    peak_rss "$work/big.m4.out" m4 -P "$work/big.ovm"
+    mrss=$rss
+    for ((i = 0; i < 3; i++)); do
+      fresh "$work/big.ovmacro.out"
+      run /dev/null "$ovmacro" -o "$work/big.ovmacro.out" "$work/big.ovm"
+      ow+=("$wall") oc+=("$cpu")
+      fresh "$work/big.m4.out"
+      run "$work/big.m4.out" m4 -P "$work/big.ovm"
+      mw+=("$wall") mc+=("$cpu")
+    done
+    cmp -s "$work/big.ovm" "$work/big.ovmacro.out" || { echo "compare_with_m4: plain text changed" >&2; exit 1; }
+    awk -v mb=$((bytes / 1000000)) -v bytes="$bytes" -v ow="$(printf '%s\n' "${ow[@]}" | median)" \
+      -v oc="$(printf '%s\n' "${oc[@]}" | median)" -v orss="$orss" \
+      -v mw="$(printf '%s\n' "${mw[@]}" | median)" -v mc="$(printf '%s\n' "${mc[@]}" | median)" \
+      -v mrss="$mrss" 'BEGIN {
+      printf "%-13s %-8s %8.3f %8.2f %12.1f %13.2fx\n", mb " MB", "ovmacro", ow, oc, orss / 1024, orss * 1024 / bytes
+      printf "%-13s %-8s %8.3f %8.2f %12.1f %13.2fx\n", "", "m4", mw, mc, mrss / 1024, mrss * 1024 / bytes
+    }'
+    rm -f "$work/big.ovmacro.out" "$work/big.m4.out"
+  done
+  rm -f "$work/big.ovm"
+}
+sizes
 
 echo
-echo "median of $runs alternating runs per tool; peak RSS is the largest of those runs; speed-up = m4 time / ovmacro"
+echo "median of $runs alternating runs per tool; peak RSS of one more run; speed-up = m4 time / ovmacro time"
 echo "time (wall and cpu = user + system); memory = ovmacro's peak RSS / its input's size;"
 echo "outputs of the two tools were identical for every workload; ovmacro $("$ovmacro" --version | awk '{ print $2 }'), $(m4 --version | head -n 1)"
 echo

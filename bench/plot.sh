@@ -3,7 +3,8 @@
 
 # plot_time_against_size SVG: times both tools on the first eighth, quarter, half and all of the plain text
 # ($work/plain.ovm) and of the call lines (at most $calls), median of $plot_runs runs each, writes the
-# table of points to $work/points.txt and draws SVG from it. Uses run, median and $ovmacro of the script.
+# table of points to $work/points.txt and draws SVG from it. Uses run, fresh, median and $ovmacro of the
+# script.
 plot_time_against_size() {
   local svg=$1 plot_runs=${PLOT_RUNS:-3}
   if ! command -v gnuplot >/dev/null; then
@@ -28,8 +29,10 @@ plot_time_against_size() {
       size=$(stat -c %s "$work/$workload-part.ovm")
       local -a ov=() m4=()
       for ((i = 0; i < plot_runs; i++)); do
-        run "$work/part.out" "$ovmacro" "$work/$workload-part.ovm"
+        fresh "$work/part.out"
+        run /dev/null "$ovmacro" -o "$work/part.out" "$work/$workload-part.ovm"
         ov+=("$wall")
+        fresh "$work/part.out"
         run "$work/part.out" m4 -P "$work/$workload-part.m4"
         m4+=("$wall")
       done

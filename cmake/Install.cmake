@@ -11,6 +11,8 @@ install(TARGETS ovMacroExpander
   EXPORT ovMacroExpanderTargets
   LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR} NAMELINK_COMPONENT Development
   RUNTIME DESTINATION ${CMAKE_INSTALL_BINDIR})
+# The Python bridge goes beside the library, where the library looks for it on the first use of Python.
+install(TARGETS ovMacroExpanderPython LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR})
 
 # Every header of the library is public (the whole namespace is exported), in its subsystem folder, beside
 # the umbrella header ovmacro/ovMacroExpander.h.
@@ -29,8 +31,8 @@ if(TARGET ovmacro)
 endif()
 
 # The exported target carries the library, its include directory and the C++20 requirement, and nothing of
-# Python: the library links it privately by file and no installed header includes Python.h, so a consumer
-# needs only the .so and the headers (the loader finds libpython through the library's own DT_NEEDED entry).
+# Python: only the bridge module, which the library loads itself, links the Python runtime, and no installed
+# header includes Python.h, so a consumer needs only the .so and the headers.
 install(EXPORT ovMacroExpanderTargets
   NAMESPACE ovMacroExpander::
   DESTINATION ${OVMACRO_CMAKE_DIR}

@@ -56,6 +56,12 @@ out=$("$prefix/bin/ovmacro" --version)
 [ "$out" = "ovmacro $version" ] || fail "ovmacro --version printed '$out', expected 'ovmacro $version'"
 out=$(printf '@def greet(who) = {Hello who!}\ngreet(install)\n' | "$prefix/bin/ovmacro")
 [ "$out" = "Hello install!" ] || fail "the installed ovmacro expanded to '$out'"
+# Python is loaded only when a text uses it, from the bridge module installed beside the library.
+if ldd "$prefix/bin/ovmacro" "$libdir/libovMacroExpander.so.$version" | grep -i python; then
+  fail "the installed tool or library needs libpython to start"
+fi
+out=$(printf '@runpython{print("py", 6 * 7)}\n' | "$prefix/bin/ovmacro")
+[ "$out" = "py 42" ] || fail "the installed ovmacro ran Python as '$out'"
 
 sample=examples/host/project.ovp
 expected=examples/host/project.expected

@@ -141,6 +141,60 @@ TEST(OutputFiles, AKilledRunLeavesNothingBehind) {
     }
 }
 
+// A large expansion goes into OUT's temporary file as it is made, from a large input mapped where it needs no
+// line-end conversion: OUT gets what standard output gets, and a failure late in the run leaves OUT as it was.
+TEST(OutputFiles, LargeExpansionsStreamIntoOutAndFailuresLeaveItAlone) {
+    std::string lines;
+    for (int i = 0; i < 20000; ++i) lines += "a line of plain text, long enough to fill the buffers\n";
+    std::string doubling = "@def d0 = {0123456789abcdef}\n";
+    for (int i = 1; i <= 15; ++i) doubling += "@def d" + std::to_string(i) + " = {d" + std::to_string(i - 1) + " d" +
+                                                std::to_string(i - 1) + "}\n";
+    const struct {
+        std::string text;
+        std::string expected;  // OUT afterwards, or "old" when the run fails
+    } cases[] = {
+        {lines, lines},
+        {"cr\rlf\r\n" + lines, "cr\rlf\n" + lines},  // read, not mapped: each CR LF becomes LF
+        {doubling + "d15\n", ""},                     // as standard output has it
+        {lines + "@fail(\"late\")\n", "old"},
+        {doubling + "d15\n@fail(\"late\")\n", "old"},
+    };
+    for (const auto& c : cases) {
+        TempDir dir;
+        dir.Write("t.ovm", c.text);
+        dir.Write("out.txt", "old");
+        const testing::ToolResult toStdout = RunTool({"t.ovm"}, "", dir.path().string());
+        const testing::ToolResult r = RunTool({"-o", "out.txt", "t.ovm"}, "", dir.path().string());
+        EXPECT_EQ(r.exitCode, c.expected == "old" ? 1 : 0) << r.err;
+        EXPECT_EQ(r.err, toStdout.err);
+        EXPECT_EQ(ReadFile(dir.path() / "out.txt"), c.expected.empty() ? toStdout.out : c.expected);
+        // d15 is 32768 times 16 characters and the blanks between them.
+        EXPECT_EQ(fs::file_size(dir.path() / "out.txt"), c.expected.empty() ? 557056u : c.expected.size());
+        EXPECT_EQ(std::distance(fs::directory_iterator(dir.path()), fs::directory_iterator{}), 2);
+    }
+}
+
+// A large input is mapped; when another process shortens it during the run, the run ends with a message, not
+// a crash, and writes nothing. The template waits, in Python, until the test has shortened it.
+TEST(OutputFiles, AnInputShortenedDuringTheRunEndsItAndWritesNothing) {
+    TempDir dir;
+    std::string text = "@runpython{\n  import os, time\n  open('ready', 'w').close()\n";
+    text += "  while not os.path.exists('go'): time.sleep(0.01)\n}\n";
+    for (int i = 0; i < 20000; ++i) text += "a line of plain text to fill the pages\n";
+    dir.Write("t.ovm", text);
+    dir.Write("out.txt", "old");
+    const auto shorten = [&](int) {
+        for (int i = 0; i < 1000 && !fs::exists(dir.path() / "ready"); ++i)
+            std::this_thread::sleep_for(std::chrono::milliseconds(10));
+        fs::resize_file(dir.path() / "t.ovm", 0);
+        dir.Write("go", "");
+    };
+    const testing::ToolResult r = RunTool({"-o", "out.txt", "t.ovm"}, "", dir.path().string(), {}, shorten);
+    EXPECT_EQ(r.exitCode, 1);
+    EXPECT_EQ(r.err, "ovmacro: an input file was shortened while it was read; nothing was written\n");
+    EXPECT_EQ(Describe(dir.path()), "go= out.txt=old ready= t.ovm= ");
+}
+
 // Runs that write the same OUT at once each leave one whole file: OUT is always one run's whole expansion.
 TEST(OutputFiles, ConcurrentRunsNeverMixTheirOutputs) {
     TempDir dir;

@@ -1,5 +1,5 @@
 // The ovmacro runs that the case files cannot state: arguments with blanks or line feeds, outputs known only
-// by their form, and the shipped example.
+// by their form, a tool without its Python module, and the shipped example.
 #include <gtest/gtest.h>
 
 #include <regex>
@@ -39,6 +39,18 @@ TEST(OvmacroTool, ArgumentsThatCaseFilesCannotSpell) {
             << r.out;
         EXPECT_EQ(r.err, c.err);
     }
+}
+
+// Python is loaded with the first text that uses it: without its module, only that text fails, at its line.
+TEST(OvmacroTool, WithoutItsPythonModuleOnlyTextsUsingPythonFail) {
+    const std::vector<std::string> noModule = {"env", "OVMACRO_PYTHON_MODULE=/none/x.so"};
+    ToolResult r = RunTool({"-"}, "a\n@def X = {1}\nX\n", "", noModule, nullptr);
+    EXPECT_EQ(r.exitCode, 0) << r.err;
+    EXPECT_EQ(r.out, "a\n1\n");
+    r = RunTool({"-"}, "a\n@runpython{x = 1}\n", "", noModule, nullptr);
+    EXPECT_EQ(r.exitCode, 1);
+    EXPECT_EQ(r.err.rfind("\n<stdin>(2) : Python initialisation error: cannot load /none/x.so: /none/x.so: ", 0), 0u)
+        << r.err;
 }
 
 TEST(OvmacroTool, CppTableExampleGivesItsExpectedHeader) {

@@ -1,5 +1,6 @@
 // The expander's fast paths against its general way: the plain-text lane, which skips quiet bytes sixteen at a
-// time while no variable has a name yet, and macro bodies that are plain text apart from their arguments.
+// time while no variable has a name yet, macro bodies that are plain text apart from their arguments, loop
+// blocks cut once into parts, and @str of a name.
 #include <gtest/gtest.h>
 
 #include <random>
@@ -110,6 +111,16 @@ TEST(PlainBodyTest, ExpandsLikeTheGeneralWay) {
         {"@let int n = 7\n@def m(a) = {(a)%%}\nm(n)\n", "(7)\n"},
         {"@def g(x) = {x}\n@def m(a) = {[a]%%}\nm(g)\n", "error@37 ( expected to begin argument list for macro g(x)"},
         {"@def m(a, b) = {a+b%%}\nm(1, m(2, @fail(\"deep\")))\n", "error@36 deep"},
+        // Parts of bodies and name arguments written without a look at their characters: the column after
+        // them, a tab, a line start that still needs its indentation, parts too long for that.
+        {"@def two = {1\n2}\n@def m(a, b) = {(a, b%%)}\nm(xx, two)\n", "(xx, 1\n     2)\n"},
+        {"@def two = {1\n2}\n@def m(a, b) = {\ta, b%%}\nm(xx, two)\n", "\txx, 1\n        2\n"},
+        {"@def m(a) = {a\na%%}\n  m(x)\n", "  x\n  x\n"},
+        {"@def m(a) = {a and a text longer than thirty-two bytes%%}\n m(x)\n", " x and x text longer than"},
+        // Argument lists of names, read in one pass (a mark after "(" makes the general way read them).
+        {"@def m(a, b) = {[a|b]}\nm(%%x ,\n y\t) m(%%r, s)m(%%x, r'q')\n", "[x|y] [r|s][x|r'q']\n"},
+        {"@def m(a, b) = {[a|b]}\nm(%%x)\n", "error@26 Insufficient arguments provided for macro m(a,b)"},
+        {"@def m(a, b) = {[a|b]}\nm(%%x, y, z)\n", "error@29 Too many arguments provided for macro m(a,b)"},
     };
     for (const auto& [text, expected] : cases) {
         const std::string fast = ExpandWithMarks(text, "");
@@ -124,6 +135,39 @@ TEST(PlainBodyTest, ExpandsLikeTheGeneralWay) {
     const std::string deep = "@def m(a) = {<a>%%}\n" + calls;
     EXPECT_NE(ExpandWithMarks(deep, "").find("nested too deeply"), std::string::npos);
     EXPECT_EQ(ExpandWithMarks(deep, ""), ExpandWithMarks(deep, "@@"));
+    // Enough calls to fill the gathered output many times over.
+    std::string many = "@def m(a, b) = {<a b>%%}\n";
+    for (int i = 0; i < 100; ++i) many += "m(x" + std::to_string(i) + ", y)\t";
+    EXPECT_EQ(ExpandWithMarks(many, ""), ExpandWithMarks(many, "@@"));
+}
+
+// Loop blocks cut once into parts, and @str of a name whose value is ordinary text, against the general way
+// that "@@" forces on them: items that are not ordinary text, names of variables, errors in an iteration.
+TEST(LoopBlockTest, ExpandsLikeTheGeneralWay) {
+    const std::pair<std::string, std::string> cases[] = {  // text, the start of its outcome
+        {"@for(x in [a, b c]){[x] @str(x),%%}\n", "[a] \"a\",[b c] \"b c\",\n"},
+        {"enum {\n    @for(n in [RED, GREEN])\n    {\n        %%n = 1 << n,\n\n    }\n};\n", "enum {\n    RED = 1 << RED,\n    GREEN"},
+        {"@for((k, v) in [(1, one), (2, `t,w`)]){k=v;%%}", "1=one;2=t,w;"},
+        {"@def g = {G}\n@for(x in [g, h, 'q', \"s\\\\\"]){<x>@str(x)%%}", "<G>\"G\"<h>\"h\"<'q'>\"'q'\"<\"s\\\\\">"},
+        {"@def y = {Y}\n@for(x in [1, y]){x y x%%}", "1 Y 1Y Y Y"},
+        {"@for(x in [1,2]){@for(y in [a,b]){x.y %%}}", "1.a 1.b 2.a 2.b "},
+        {"@for(x in [`a\nb`, c]){  x @str(x)%%}", "  a\n  b \"a\\nb\"  c \"c\""},
+        {"@for(x in [1, @fail(\"deep\")]){x%%}", "error@19 deep"},
+        {"@for(x in [1, 2]){x @if(x){}%%}", "error@20 No implicit conversion from int64 to bool"},
+        // A list that expands to itself, or a macro whose body is one, is cut as it stands.
+        {"@def L = {[a, (b, c)]}\n@for(x in L%%){<x>}@for(x in  L %%){<x>}@for(x in [p, q]%%){<x>}",
+         "<a><(b, c)><a><(b, c)><p><q>"},
+        {"@def L = {[1, 2]}\n@for(x in L%%){@if(x){}}", "error@31 No implicit conversion from int64 to bool"},
+        {"@def L = {a, b}\n@for(x in L%%){x}", "error@25 [ expected when read a"},
+        {"@def y = {Y}\n@def L = {[y, z]}\n@def M = {\n[m]}\n@for(x in L%%){x}@for(x in M%%){x}", "Yzm"},
+        {"@def X = {hello}\n@let int n = 3\n@def q = {\"a\\\\\"}\n@str(X%%)@str(n%%)@str(q%%)@str(Z%%)@strx(X%%)",
+         "\"hello\"\"3\"\"\\\"a\\\\\\\\\\\"\"\"Z\"\"hello\""},
+    };
+    for (const auto& [text, expected] : cases) {
+        const std::string fast = ExpandWithMarks(text, "");
+        EXPECT_EQ(fast.substr(0, expected.size()), expected) << text;
+        EXPECT_EQ(fast, ExpandWithMarks(text, "@@")) << text;
+    }
 }
 
 }  // namespace

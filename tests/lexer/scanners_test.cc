@@ -2,6 +2,7 @@
 // its end. Scanning errors that a template reaches are golden cases; here are those that only a call shows.
 #include <gtest/gtest.h>
 
+#include <random>
 #include <sstream>
 
 #include "ovmacro/lexer/section_scanners.h"
@@ -58,6 +59,12 @@ template <EToken terminator>
 std::string Arg(BasicSubString& s) {
     BasicSubString arg;
     const LSToken end = ScanArgument(s, arg, terminator);
+    return Str(arg) + "|" + end.GetTokenString();
+}
+template <EToken terminator>
+std::string ArgByTokens(BasicSubString& s) {
+    BasicSubString arg;
+    const LSToken end = ScanArgumentTokenByToken(s, arg, terminator);
     return Str(arg) + "|" + end.GetTokenString();
 }
 std::string Round(BasicSubString& s) { return Str(ScanRndBrackettedSection(s, true)); }
@@ -159,6 +166,21 @@ TEST(Scanners, EveryPrefixIsHandledWithinTheInput) {
             for (Scanner scan : {Toks<true>, Value, Char, Given, ArgP, ArgS, Round, RoundIn, Subst, RndStr,
                                  Else, ElseIf, Same, Unquote, Trail})
                 EXPECT_NE(Outcome(scan, text.substr(0, n)).substr(0, 2), "- ") << text.substr(0, n);
+}
+
+// Arguments skip the tokens that cannot matter without reading them one by one: random texts from the bytes
+// that do matter end where the token scanner ends them, with the same errors.
+TEST(Scanners, ArgumentsEndWhereTheTokenScannerEndsThem) {
+    const std::string alphabet = "aarR_x9 \t\n,,(()[]]{}.;#~`-<+/*\"\"''\\@\x01\xc3";
+    std::mt19937 random(2468);
+    std::uniform_int_distribution<size_t> pick(0, alphabet.size() - 1);
+    std::uniform_int_distribution<int> length(0, 24);
+    for (int i = 0; i < 20000 && !HasFailure(); ++i) {
+        std::string text;
+        for (int n = length(random); n > 0; --n) text += alphabet[pick(random)];
+        EXPECT_EQ(Outcome(ArgP, text), Outcome(ArgByTokens<TK_RPAREN>, text)) << ::testing::PrintToString(text);
+        EXPECT_EQ(Outcome(ArgS, text), Outcome(ArgByTokens<TK_RBRACKET>, text)) << ::testing::PrintToString(text);
+    }
 }
 
 }  // namespace

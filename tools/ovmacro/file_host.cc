@@ -164,7 +164,7 @@ void FileHost::ReadSettingsOf(MpfwSourceFile* file, xostream& out) {
     } catch (LexScannerException& e) {
         // The end of the expanded text stands for the end of the file.
         if (e.GetPosition() == file->expandedText.data() + file->expandedText.size())
-            e.SetPosition(file->text.data() + file->text.size());
+            e.SetPosition(file->Text().end());
         file->AdjustErrorPosition(e);
         // Text made by a macro that a double expansion or a loop item defined maps into that made text.
         MovePositionOutOfHeldTexts(e);

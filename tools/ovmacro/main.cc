@@ -145,6 +145,9 @@ int Run(int argc, char** argv) {
         return kExitUsage;
     }
     if (options.noPython || options.restricted) SetPythonAllowed(false);
+#ifdef OVMACRO_BUILD_PYTHON_MODULE
+    SetPythonModuleFallback(OVMACRO_BUILD_PYTHON_MODULE);  // for a tool run from its build tree
+#endif
     MacroNestingGuard::SetOutputLimit(options.maxOutput);
 
     // The list of loaded files outlives the frame, whose variables are named by views into their texts.
@@ -160,6 +163,8 @@ int Run(int argc, char** argv) {
     // The map from the expansion back to the sources serves the settings (their errors), line markers and
     // source maps; without them it is not kept.
     host.SetKeepOutputPieces(options.settings || options.lineMarkers || !options.sourceMapPath.empty());
+    host.SetMapLargeFiles(true);
+    ovmacro_tool::EndRunWhenAMappedInputShrinks();
     // Generated code must not carry @import lines; the settings reader meets each import at its line.
     host.SetKeepImportDirectives(options.settings || options.keepImports);
 
@@ -167,6 +172,15 @@ int Run(int argc, char** argv) {
         host.LoadText("<command line>", DefinitionsText(options)) != FileHost::Load::kOk)
         return kExitExpansionError;
 
+    // When nothing else reads the expansion, it goes into OUT's temporary file as it is made, through a bounded
+    // buffer, and OUT is replaced only when it succeeds. (An OUT that cannot take it so is written as before.)
+    const bool streamed = outputs.out >= 0 && !options.settings && !options.lineMarkers &&
+                          options.sourceMapPath.empty() && [&] {
+                              std::string ignored;  // an unwritable OUT is reported after the expansion
+                              xostream* stream = outputs.files.StageStream(outputs.out, ignored);
+                              host.StreamNextExpansion(stream);
+                              return stream != nullptr;
+                          }();
     FileHost::Load load;
     if (options.inputPath == "-") {
         std::string text;
@@ -221,7 +235,7 @@ int Run(int argc, char** argv) {
         return kExitUsage;
     }
     const std::string dependencies = options.depsPath.empty() ? "" : DependencyText(options, host);
-    const bool staged = (outputs.out < 0 || outputs.files.Stage(outputs.out, *result, error)) &&
+    const bool staged = (outputs.out < 0 || streamed || outputs.files.Stage(outputs.out, *result, error)) &&
                         (outputs.deps < 0 || outputs.files.Stage(outputs.deps, dependencies, error)) &&
                         (outputs.sourceMap < 0 || outputs.files.Stage(outputs.sourceMap, sourceMap, error));
     if (!staged || !outputs.files.Commit(error)) {

@@ -41,6 +41,18 @@ void RegisterTempName(const std::string& name) {
     }
 }
 
+extern "C" void EndRunOnShrunkInput(int signal, siginfo_t* info, void*) {
+    if (info->si_code != BUS_ADRERR) {  // not a page beyond a file's end: the fault it is
+        std::signal(signal, SIG_DFL);
+        return;
+    }
+    for (int i = 0; i < kTempSlots; ++i)
+        if (g_tempInUse[i]) ::unlink(g_tempNames[i]);
+    static const char kMessage[] = "ovmacro: an input file was shortened while it was read; nothing was written\n";
+    (void)!::write(2, kMessage, sizeof kMessage - 1);
+    ::_exit(1);
+}
+
 void ForgetTempName(const std::string& name) {
     for (int i = 0; i < kTempSlots; ++i)
         if (g_tempInUse[i] && name == g_tempNames[i]) g_tempInUse[i] = 0;
@@ -87,6 +99,36 @@ bool IdentityOfExistingFile(const std::string& path, FileIdentity& id) {
     id = {st.st_dev, st.st_ino, ""};
     return true;
 }
+
+// Writes into a temporary file through a buffer of bounded size; the first failure is kept for Commit.
+class OutputFiles::TempStream : public orvan::xostream {
+public:
+    explicit TempStream(int fd) : fd_(fd) { buffer_.reserve(kBufferSize); }
+    ~TempStream() override = default;
+    void flush() override {
+        if (error_ == 0 && !OutputFiles::WriteAll(fd_, buffer_)) error_ = errno;
+        buffer_.clear();
+    }
+    int error() const { return error_; }
+
+protected:
+    void DoWrite(const char* p, size_t n) override {
+        if (buffer_.size() + n > kBufferSize) flush();
+        if (n >= kBufferSize) {
+            if (error_ == 0 && !OutputFiles::WriteAll(fd_, std::string_view(p, n))) error_ = errno;
+        } else {
+            buffer_.append(p, n);
+        }
+    }
+
+private:
+    static constexpr size_t kBufferSize = 256 * 1024;
+    int fd_;
+    int error_ = 0;
+    std::string buffer_;
+};
+
+OutputFiles::OutputFiles() = default;
 
 OutputFiles::~OutputFiles() {
     for (Output& out : outputs_) {
@@ -179,6 +221,18 @@ bool OutputFiles::StageReplacement(Output& out, std::string& error) {
     return true;
 }
 
+orvan::xostream* OutputFiles::StageStream(size_t index, std::string& error) {
+    Output& out = outputs_[index];
+    if (out.mode != Mode::kReplace) return nullptr;
+    if (!StageReplacement(out, error)) {
+        error = "cannot write " + out.path + ": " + error;
+        return nullptr;
+    }
+    if (out.mode != Mode::kReplace) return nullptr;  // rewritten in place: staged whole instead
+    out.stream = std::make_unique<TempStream>(out.fd);
+    return out.stream.get();
+}
+
 bool OutputFiles::Stage(size_t index, std::string_view text, std::string& error) {
     Output& out = outputs_[index];
     out.text = text;
@@ -193,6 +247,11 @@ bool OutputFiles::Commit(std::string& error) {
         error = "cannot write " + out.path + ": " + std::strerror(reason);
         return false;  // the destructor removes every temporary name
     };
+    for (Output& out : outputs_) {
+        if (!out.stream) continue;
+        out.stream->flush();
+        if (out.stream->error() != 0) return fail(out, out.stream->error());
+    }
     // Unnamed temporary files get a name of their own, beside their target, first: a failure here replaces
     // nothing.
     for (Output& out : outputs_) {
@@ -226,6 +285,14 @@ bool OutputFiles::Commit(std::string& error) {
         out.tempName.clear();
     }
     return true;
+}
+
+void EndRunWhenAMappedInputShrinks() {
+    struct sigaction action {};
+    action.sa_sigaction = EndRunOnShrunkInput;
+    action.sa_flags = SA_SIGINFO;
+    sigemptyset(&action.sa_mask);
+    ::sigaction(SIGBUS, &action, nullptr);
 }
 
 }  // namespace ovmacro_tool

@@ -16,9 +16,12 @@
 
 #include <sys/types.h>
 
+#include <memory>
 #include <string>
 #include <string_view>
 #include <vector>
+
+#include "ovmacro/foundations/stream.h"
 
 namespace ovmacro_tool {
 
@@ -36,7 +39,7 @@ bool IdentityOfExistingFile(const std::string& path, FileIdentity& id);
 
 class OutputFiles {
 public:
-    OutputFiles() = default;
+    OutputFiles();
     ~OutputFiles();
     OutputFiles(const OutputFiles&) = delete;
     OutputFiles& operator=(const OutputFiles&) = delete;
@@ -50,12 +53,17 @@ public:
     // Writes the text of output `index` where it waits for the commit (a temporary file), or keeps it for a
     // direct or in-place write; false with `error` when that fails. `text` must outlive Commit.
     bool Stage(size_t index, std::string_view text, std::string& error);
+    // A stream into the temporary file of output `index`, for a text written as it is made, through a bounded
+    // buffer; null when the output is not replaced through a temporary file (a device, a file rewritten in
+    // place), which must then be staged whole. A write that fails is reported by Commit.
+    orvan::xostream* StageStream(size_t index, std::string& error);
     // Puts every staged output in place; false with `error` (naming the output) when one fails, in which case
     // no renamed output has been replaced.
     bool Commit(std::string& error);
 
 private:
     enum class Mode { kReplace, kInPlace, kDirect };
+    class TempStream;
     struct Output {
         std::string path;    // as given, for messages
         std::string target;  // symlinks resolved
@@ -64,11 +72,17 @@ private:
         int fd = -1;
         std::string tempName;  // the temporary file's name once it has one
         std::string_view text;
+        std::unique_ptr<TempStream> stream;
     };
     bool StageReplacement(Output& out, std::string& error);
     static bool WriteAll(int fd, std::string_view text);
 
     std::vector<Output> outputs_;
 };
+
+// A mapped input faults when another process shortens the file during the run. From this call on, such a
+// fault ends the run with a message and exit status 1 instead of a crash: the temporary files are removed and
+// nothing has been committed, since every output is committed after the inputs were read.
+void EndRunWhenAMappedInputShrinks();
 
 }  // namespace ovmacro_tool

@@ -43,7 +43,7 @@ public:
 
 private:
     struct Text {
-        const std::string* text;
+        std::string_view text;
         int file;                        // index into names_
         std::vector<size_t> lineStarts;  // offsets at which each line begins, made on first use
     };

@@ -3,6 +3,7 @@
 // expression, or evaluated by Python.
 #include <memory>
 #include <optional>
+#include <span>
 
 #include "ovmacro/expander/call_context.h"
 #include "ovmacro/expander/held_text.h"
@@ -13,6 +14,7 @@
 #include "ovmacro/expander/plain_text.h"
 #include "ovmacro/expr/expression_parser.h"
 #include "ovmacro/foundations/compose.h"
+#include "ovmacro/foundations/scanning.h"
 #include "ovmacro/foundations/small_buffer.h"
 #include "ovmacro/foundations/text_format.h"
 #include "ovmacro/lexer/section_scanners.h"
@@ -29,6 +31,28 @@ bool IsPlainText(const LSMacroVariable& m, const VarFrame* bodyParent) {
     const bool dollarMacrosActive =
         fileScope && (!fileScope->dollarMacros.empty() || !fileScope->importedFiles.empty());
     return SkipPlainText(body.begin(), body.end(), m.GetIndent() > 0, dollarMacrosActive).stop == body.end();
+}
+
+// The commonest argument list: "(", then names separated by commas, then ")", blanks allowed around each
+// name. Read in one pass, each name exactly as ScanArgument reads it; false, with the cursor where it was, for
+// any other list (and for a wrong number of arguments), which the general way reads and reports.
+bool ReadNameArguments(BasicSubString& cursor, std::span<BasicSubString> actual) {
+    const char* p = cursor.begin();
+    const char* const end = cursor.end();
+    if (p == end || *p != '(') return false;
+    ++p;
+    for (size_t i = 0; i < actual.size(); ++i) {
+        while (p < end && IsWhiteSpace(*p)) ++p;
+        if (p == end || !IsIdentifierStart(*p) || BeginsRawLiteral(p, end)) return false;
+        const char* const start = p++;
+        while (p < end && IsIdentifierChar(*p)) ++p;
+        actual[i] = BasicSubString(start, p);
+        while (p < end && IsWhiteSpace(*p)) ++p;
+        if (p == end || *p != (i + 1 < actual.size() ? ',' : ')')) return false;
+        ++p;
+    }
+    cursor.SetBegin(p);
+    return true;
 }
 
 }  // namespace
@@ -51,7 +75,8 @@ void MacroExpander::InvokeVariable(LSVariable* v) {
     constexpr size_t kInlineArgs = 4;
     SmallBuffer<BasicSubString, kInlineArgs> actual(static_cast<size_t>(n));
     const ObservedExpansion observed(*m, currentToken, actual, output);
-    if (n > 0) {
+    const bool nameArguments = n > 0 && ReadNameArguments(cursor, {actual.data(), actual.size()});
+    if (n > 0 && !nameArguments) {
         const LSToken open = ReadToken();
         if (open.type != TK_LPAREN)
             throw LexScannerException(
@@ -76,7 +101,7 @@ void MacroExpander::InvokeVariable(LSVariable* v) {
         MacroNestingGuard::ChargeOutput(output->GetCharCount() - before, body.begin());
         return;
     }
-    if (n > 0 && ExpandPlainBody(*m, parentFrame, actual.view())) return;
+    if (n > 0 && ExpandPlainBody(*m, parentFrame, actual.view(), nameArguments)) return;
     std::optional<VarFrame> ownFrame;
     VarFrame* bodyFrame = frame;
     if (!m->IsNaked()) bodyFrame = &ownFrame.emplace(parentFrame);

@@ -1,9 +1,14 @@
 // @for over a list or a list of tuples, and @while: expand a block once per item or while a condition holds.
+#include <algorithm>
+
 #include "ovmacro/expander/directive_text.h"
 #include "ovmacro/expander/expansion_observer.h"
 #include "ovmacro/expander/held_text.h"
 #include "ovmacro/expander/macro_expander.h"
+#include "ovmacro/expander/nesting_guard.h"
+#include "ovmacro/expander/plain_text.h"
 #include "ovmacro/foundations/compose.h"
+#include "ovmacro/foundations/scanning.h"
 #include "ovmacro/lexer/section_scanners.h"
 #include "ovmacro/lexer/token_scanner.h"
 
@@ -20,6 +25,29 @@ void BindLoopName(VarFrame& iterationFrame, VarFrame* loopFrame, BasicSubString 
 }
 
 }  // namespace
+
+BasicSubString MacroExpander::OrdinaryListText(BasicSubString listText) {
+    if (ExpansionObserver::CallWatcher()) return {};  // which sees the list's macro invoked
+    if (std::find(listText.begin(), listText.end(), '\n') != listText.end()) return {};
+    BasicSubString rest = listText;
+    ScanWhiteSpace(rest);
+    const char* wordBegin = rest.begin();
+    if (ScanIdentifier(rest)) {
+        const BasicSubString word(wordBegin, rest.begin());
+        ScanWhiteSpace(rest);
+        if (!rest.empty()) return {};
+        text = OrdinaryValueOfName(FindVariable(word), frame);
+        if (text.empty()) return {};
+        // The list's expansion is a level, and the macro's body one inside it.
+        const MacroNestingGuard listLevel(listText.begin()), bodyLevel(text.begin());
+        MacroNestingGuard::ChargeOutput(listText.size() - word.size() + text.size(), listText.begin());
+        return text;
+    }
+    if (!IsOrdinaryTextIn(listText, frame, DollarMacrosActive(frame))) return {};
+    const MacroNestingGuard listLevel(listText.begin());
+    MacroNestingGuard::ChargeOutput(listText.size(), listText.begin());
+    return listText;
+}
 
 void MacroExpander::ProcessForDirective() {
     LSToken token = ReadToken();
@@ -51,9 +79,15 @@ void MacroExpander::ProcessForDirective() {
 
     // Items are views into the expanded list, and so are the bodies of the loop names: the list is a held
     // text, which outlives the loop if its items define anything, and from which errors move to the source.
+    // A list that expands to itself, or the name of a macro whose body is such a list (one list used by
+    // several loops), is taken as it stands, where its items and their errors already lie in the source.
     HeldTextKeeper keeper(frame);
-    const HeldText& held = keeper.ExpandAndHold(" @for", listText);
-    const BasicSubString list = held.GetText();
+    const HeldText* held = nullptr;
+    BasicSubString list = OrdinaryListText(listText);
+    if (list.empty()) {
+        held = &keeper.ExpandAndHold(" @for", listText);
+        list = held->GetText();
+    }
     int64 indent = 0;
     BasicSubString block;
     try {
@@ -72,6 +106,14 @@ void MacroExpander::ProcessForDirective() {
     BasicSubString items(list);
     const LSToken open = LsScanToken(items, false);
     if (open.type != TK_LBRACKET) throw listError(Compose("[ expected when read ", open));
+    if (names.empty()) names.push_back(singleName);
+    // A block of ordinary text, loop names and @str of them is cut once and written item by item.
+    LoopBlockPlan plan;
+    // A tool that watches calls sees each loop name invoked: the general way, which invokes them.
+    const bool planned =
+        !ExpansionObserver::CallWatcher() && PlanLoopBlock(block, indent, names, frame, plan);
+    const bool dollarMacrosActive = planned && DollarMacrosActive(frame);
+    xvector<BasicSubString> values(names.size());
     for (;;) {
         BasicSubString item;
         LSToken end;
@@ -84,18 +126,16 @@ void MacroExpander::ProcessForDirective() {
         }
         if (end.type != TK_COMMA && item.empty()) break;
 
-        VarFrame iterationFrame(frame);
-        if (names.empty()) {
-            BindLoopName(iterationFrame, frame, singleName, item);
+        if (singleName) {
+            values[0] = item;
         } else {
-            BasicSubString values = item;
-            const LSToken tupleOpen = LsScanToken(values, false);
+            BasicSubString rest = item;
+            const LSToken tupleOpen = LsScanToken(rest, false);
             if (tupleOpen.type != TK_LPAREN) throw listError(Compose("( expected when read ", tupleOpen));
             for (size_t i = 0; i < names.size(); ++i) {
-                BasicSubString value;
                 LSToken valueEnd;
                 try {
-                    valueEnd = ScanArgument(values, value, TK_RPAREN);
+                    valueEnd = ScanArgument(rest, values[i], TK_RPAREN);
                 } catch (LexScannerException& e) {
                     e.AppendContextLine(Compose("\n    in @for directive for list ", list));
                     e.SetPosition(listPosition);
@@ -104,14 +144,24 @@ void MacroExpander::ProcessForDirective() {
                 const bool last = i + 1 == names.size();
                 if (!last && valueEnd.type != TK_COMMA) throw listError(Compose(", expected when read ", valueEnd));
                 if (last && valueEnd.type != TK_RPAREN) throw listError(Compose(") expected when read ", valueEnd));
-                BindLoopName(iterationFrame, frame, names[i], value);
             }
         }
+        const bool plain = planned && std::all_of(plan.begin(), plan.end(), [&](const LoopBlockPart& part) {
+            return part.kind == LoopBlockPart::kText ||
+                   (IsPlainLoopItem(values[part.name], frame, dollarMacrosActive) &&
+                    (part.kind == LoopBlockPart::kName || !values[part.name].empty()));
+        });
         try {
             const ObservedExpansion observed("@for", currentToken, singleName, item, *output);
-            MacroExpand(nullptr, &iterationFrame, block, indent, blockOutputIndent, *output);
+            if (plain) {
+                WritePlannedIteration(plan, values, block, blockOutputIndent);
+            } else {
+                VarFrame iterationFrame(frame);
+                for (size_t i = 0; i < names.size(); ++i) BindLoopName(iterationFrame, frame, names[i], values[i]);
+                MacroExpand(nullptr, &iterationFrame, block, indent, blockOutputIndent, *output);
+            }
         } catch (LexScannerException& e) {
-            held.MovePositionOut(e);
+            if (held) held->MovePositionOut(e);
             // A call-chain line: a block that invokes itself would otherwise add one line per level.
             e.AppendCallContextLine(Compose("\n    in @for directive when ", singleName, " = ", item));
             throw;

@@ -17,6 +17,7 @@
 #include <span>
 
 #include "ovmacro/expander/import_handler.h"
+#include "ovmacro/expander/loop_block.h"
 #include "ovmacro/lexer/token.h"
 #include "ovmacro/output/expanded_output.h"
 #include "ovmacro/vars/var_frame.h"
@@ -84,14 +85,21 @@ private:
     void InvokeVariable(LSVariable* v);
     void InvokeMacroFunction(LSMacroVariable* m);
     // Expands a call whose body is ordinary text apart from the names of untyped arguments; false, having
-    // written nothing, for any other macro.
-    bool ExpandPlainBody(const LSMacroVariable& m, VarFrame* parentFrame, std::span<const BasicSubString> actual);
+    // written nothing, for any other macro. `namesOnly`: each argument is known to be one identifier.
+    bool ExpandPlainBody(const LSMacroVariable& m, VarFrame* parentFrame, std::span<const BasicSubString> actual,
+                         bool namesOnly);
     basic_xstring EvaluateString(BasicSubString text, BasicSubString directiveName);
     // Conditionals and loops.
     void ProcessIfDirective();
     bool ParseBoolExpressionInBrackets(BasicSubString directiveName);
     void ProcessWhileDirective();
     void ProcessForDirective();
+    // One iteration of a @for block cut by PlanLoopBlock (loop_block.h), with the items of its loop names.
+    // The text that a @for list expands to when that is known without expanding it (a view into the
+    // source), or empty.
+    BasicSubString OrdinaryListText(BasicSubString listText);
+    void WritePlannedIteration(const LoopBlockPlan& plan, std::span<const BasicSubString> items, BasicSubString block,
+                               int64 blockOutputIndent);
     // Assignment and scope.
     void ProcessLetDirective();
     void ProcessDollarDefDirective();

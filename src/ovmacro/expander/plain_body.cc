@@ -2,6 +2,7 @@
 // is written as it stands and each name is replaced by the expansion of its argument, without the frame,
 // bindings and nested expander that the general way builds. The output, its pieces, the nesting count and
 // every error report are the same as the general way's.
+#include <algorithm>
 #include <cstdint>
 
 #include "ovmacro/expander/call_context.h"
@@ -16,12 +17,19 @@ namespace orvan {
 
 namespace {
 
-// Where the body names an argument, and which one.
+// Where the body names an argument, and which one; and whether the body's text before it holds no line feed
+// and no tab and fits ExpandedOutput::TryGatherLineFreeRun.
 struct ArgumentUse {
     const char* begin;
     const char* end;
     int64 arg;
+    bool lineFreeBefore;
 };
+
+bool IsLineFreeRun(const char* p, const char* end) {
+    return end > p && end - p <= ExpandedOutput::kMaxLineFreeRun && std::find(p, end, '\n') == end &&
+           std::find(p, end, '\t') == end;
+}
 
 // Bodies with more uses than this take the general way.
 constexpr int64 kMaxPlainBodyUses = 16;
@@ -42,7 +50,7 @@ bool ScanPlainBody(const LSMacroVariable& m, bool dollarMacrosActive, ArgumentUs
         if (!run.nameEnd || count == kMaxPlainBodyUses) return false;
         const int64 arg = m.FindArgName(BasicSubString(run.stop, run.nameEnd));
         if (arg < 0) return false;
-        uses[count++] = {run.stop, run.nameEnd, arg};
+        uses[count++] = {run.stop, run.nameEnd, arg, IsLineFreeRun(p, run.stop)};
         p = run.nameEnd;
     }
 }
@@ -52,14 +60,17 @@ bool ScanPlainBody(const LSMacroVariable& m, bool dollarMacrosActive, ArgumentUs
 // its body and argument names lie, so that a host that gives it another body or other arguments is noticed.
 class PlainBodySplits {
 public:
-    bool Split(const LSMacroVariable& m, bool dollarMacrosActive, ArgumentUse* uses, int64& count) {
+    // Also tells whether the text after the last use is a line-free run.
+    bool Split(const LSMacroVariable& m, bool dollarMacrosActive, ArgumentUse* uses, int64& count,
+               bool& lineFreeTail) {
         const BasicSubString body = m.GetSubstitutionString();
         const bool indented = m.GetIndent() > 0;
         for (Entry& e : entries_) {
             if (!e.Matches(m, body, indented, dollarMacrosActive, NameFilter::Generation())) continue;
+            // The entry's body lies where the macro's lies now, so its pointers hold.
             count = e.count;
-            for (int64 u = 0; u < count; ++u)
-                uses[u] = {body.begin() + e.uses[u].begin, body.begin() + e.uses[u].end, e.uses[u].arg};
+            std::copy_n(e.uses, count, uses);
+            lineFreeTail = e.lineFreeTail;
             return e.plain;
         }
         // The general way binds each argument in a list, which lets the fast lane stop at its name; without
@@ -77,15 +88,13 @@ public:
         e.indented = indented;
         e.dollarMacrosActive = dollarMacrosActive;
         e.count = e.plain ? count : 0;
-        for (int64 u = 0; u < e.count; ++u)
-            e.uses[u] = {uses[u].begin - body.begin(), uses[u].end - body.begin(), uses[u].arg};
+        std::copy_n(uses, e.count, e.uses);
+        e.lineFreeTail = IsLineFreeRun(count > 0 ? uses[count - 1].end : body.begin(), body.end());
+        lineFreeTail = e.lineFreeTail;
         return e.plain;
     }
 
 private:
-    struct Use {
-        int64 begin, end, arg;  // offsets in the body
-    };
     static bool SameView(BasicSubString a, BasicSubString b) { return a.begin() == b.begin() && a.end() == b.end(); }
     struct Entry {
         bool Matches(const LSMacroVariable& m, BasicSubString text, bool indentedNow, bool dollarNow,
@@ -106,7 +115,8 @@ private:
         BasicSubString body;
         xvector<BasicSubString> formals;
         int64 count = 0;
-        Use uses[kMaxPlainBodyUses];
+        ArgumentUse uses[kMaxPlainBodyUses];
+        bool lineFreeTail = false;
     };
     static constexpr size_t kEntries = 4;
     Entry entries_[kEntries];
@@ -117,69 +127,69 @@ private:
 // library with dlopen.
 thread_local PlainBodySplits t_splits;
 
-// Whether an argument expands to itself in `frame`: ordinary text, and names that no variable there has.
-// Whatever would raise an error (a lookup, the scanner) leaves it to the expansion, which reports it.
-bool IsOrdinaryTextIn(BasicSubString text, VarFrame* frame, bool dollarMacrosActive) {
+// The ways off the common path, out of line so that the loop over the body keeps its values in registers.
+[[gnu::noinline]] void WriteCopiedAndCharge(ExpandedOutput& output, BasicSubString s, int64 indent) {
+    if (s.empty()) return;
+    const int64 before = output.GetCharCount();
+    WriteCopiedText(output, s, indent);
+    MacroNestingGuard::ChargeOutput(output.GetCharCount() - before, s.begin());
+}
+
+[[gnu::noinline]] void ExpandArgument(VarFrame* frame, BasicSubString arg, int64 indent, ExpandedOutput& output,
+                                      BasicSubString formalName) {
     try {
-        for (const char* p = text.begin();;) {
-            const PlainTextRun run = SkipPlainText(p, text.end(), false, dollarMacrosActive);
-            if (run.stop == text.end()) return true;
-            if (!run.nameEnd || frame->Find(BasicSubString(run.stop, run.nameEnd), run.nameEnd)) return false;
-            p = run.nameEnd;
-        }
-    } catch (const LexScannerException&) {
-        return false;
+        VarFrame argFrame(frame);
+        MacroExpand(nullptr, &argFrame, arg, 0, indent, output);
+    } catch (LexScannerException& e) {
+        e.AppendCallContextLine(Compose("\n    invoking macro ", formalName));
+        throw;
     }
 }
 
 }  // namespace
 
 bool MacroExpander::ExpandPlainBody(const LSMacroVariable& m, VarFrame* parentFrame,
-                                    std::span<const BasicSubString> actual) {
+                                    std::span<const BasicSubString> actual, bool namesOnly) {
     // Naked macros leave their bindings behind, and typed arguments or results need evaluation.
     if (m.IsPython() || m.IsNaked() || m.GetReturnType() != LSV_Macro) return false;
     for (int64 i = 0; i < m.GetNumArgs(); ++i)
         if (m.GetArg(i).type != LSV_Macro || m.GetArg(i).isFnArg) return false;
-    const FileScopeVarFrame* bodyScope = parentFrame->GetFileScopeVarFrame();
-    auto dollarMacrosActive = [](const FileScopeVarFrame* scope) {
-        return scope && (!scope->dollarMacros.empty() || !scope->importedFiles.empty());
-    };
     ArgumentUse uses[kMaxPlainBodyUses];
     int64 count = 0;
-    if (!t_splits.Split(m, dollarMacrosActive(bodyScope), uses, count)) return false;
+    bool lineFreeTail = false;
+    const bool bodyDollarMacrosActive = DollarMacrosActive(parentFrame);
+    if (!t_splits.Split(m, bodyDollarMacrosActive, uses, count, lineFreeTail)) return false;
 
     const BasicSubString body = m.GetSubstitutionString();
     const int64 bodyIndent = GetOutputPos();
-    const bool argDollarMacrosActive = count > 0 && dollarMacrosActive(frame->GetFileScopeVarFrame());
-    auto writeCopied = [&](BasicSubString s, int64 indent) {
-        if (s.empty()) return;
-        const int64 before = output->GetCharCount();
-        WriteCopiedText(*output, s, indent);
-        MacroNestingGuard::ChargeOutput(output->GetCharCount() - before, s.begin());
+    const bool argDollarMacrosActive =
+        count > 0 && (parentFrame == frame ? bodyDollarMacrosActive : DollarMacrosActive(frame));
+    // Runs known to be line free skip the look at their characters, unless they may lie in a held text.
+    auto writeCopied = [&](BasicSubString s, int64 indent, bool lineFree) __attribute__((always_inline)) {
+        if (lineFree && g_liveHeldTexts.load(std::memory_order_relaxed) == 0 &&
+            output->TryGatherLineFreeRun(s, indent))
+            MacroNestingGuard::ChargeOutput(s.size(), s.begin());
+        else
+            WriteCopiedAndCharge(*output, s, indent);
     };
     try {
         MacroNestingGuard bodyGuard(body.begin());  // the body is one expansion level, as the general way
         const char* p = body.begin();
         for (int64 u = 0; u < count; ++u) {
-            writeCopied(BasicSubString(p, uses[u].begin), bodyIndent);
+            writeCopied(BasicSubString(p, uses[u].begin), bodyIndent, uses[u].lineFreeBefore);
             p = uses[u].end;
             // The argument is expanded where it is used, with the invoker's names, at the column reached.
             const BasicSubString arg = actual[static_cast<size_t>(uses[u].arg)];
             const int64 column = output->GetColumnPos();
             const int64 argIndent = column >= 0 ? column : bodyIndent;
-            if (IsOrdinaryTextIn(arg, frame, argDollarMacrosActive)) {
-                writeCopied(arg, argIndent);
+            const bool word = namesOnly || IsOneWord(arg);
+            if (word ? IsOrdinaryWordIn(arg, frame) : IsOrdinaryTextIn(arg, frame, argDollarMacrosActive)) {
+                writeCopied(arg, argIndent, word);
                 continue;
             }
-            try {
-                VarFrame argFrame(frame);
-                MacroExpand(nullptr, &argFrame, arg, 0, argIndent, *output);
-            } catch (LexScannerException& e) {
-                e.AppendCallContextLine(Compose("\n    invoking macro ", m.GetArg(uses[u].arg).name));
-                throw;
-            }
+            ExpandArgument(frame, arg, argIndent, *output, m.GetArg(uses[u].arg).name);
         }
-        writeCopied(BasicSubString(p, body.end()), bodyIndent);
+        writeCopied(BasicSubString(p, body.end()), bodyIndent, lineFreeTail);
     } catch (LexScannerException& e) {
         e.AppendCallContextLine(
             InvokingMacroLine(m, actual.size(), [&](xostream& os, size_t i) { os << actual[i]; }));

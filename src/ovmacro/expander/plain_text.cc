@@ -1,5 +1,6 @@
 #include "ovmacro/expander/plain_text.h"
 
+#include <algorithm>
 #include <array>
 #include <cstring>
 
@@ -11,6 +12,8 @@
 #include "ovmacro/lexer/char_classes.h"
 #include "ovmacro/lexer/token_scanner.h"
 #include "ovmacro/vars/name_filter.h"
+#include "ovmacro/vars/var_frame.h"
+#include "ovmacro/vars/variable.h"
 
 namespace orvan {
 
@@ -202,6 +205,39 @@ PlainTextRun SkipPlainText(const char* p, const char* end, bool lineFeedsNeedWor
 PlainTextRun SkipPlainTextWithoutNames(const char* p, const char* end, bool lineFeedsNeedWork,
                                        bool dollarMacrosActive) {
     return SkipPlainTextIn(p, end, lineFeedsNeedWork, dollarMacrosActive, true);
+}
+
+bool DollarMacrosActive(const VarFrame* frame) {
+    const FileScopeVarFrame* scope = frame ? frame->GetFileScopeVarFrame() : nullptr;
+    return scope && (!scope->dollarMacros.empty() || !scope->importedFiles.empty());
+}
+
+bool NamesVariableIn(BasicSubString name, VarFrame* frame) { return frame->Find(name, name.end()) != nullptr; }
+
+bool IsOrdinaryTextIn(BasicSubString text, VarFrame* frame, bool dollarMacrosActive) {
+    // The commonest text, one word, is known from the filter of names (and a lookup when it may be one).
+    if (IsOneWord(text)) return IsOrdinaryWordIn(text, frame);
+    try {
+        for (const char* p = text.begin();;) {
+            const PlainTextRun run = SkipPlainText(p, text.end(), false, dollarMacrosActive);
+            if (run.stop == text.end()) return true;
+            if (!run.nameEnd || frame->Find(BasicSubString(run.stop, run.nameEnd), run.nameEnd)) return false;
+            p = run.nameEnd;
+        }
+    } catch (const LexScannerException&) {
+        return false;
+    }
+}
+
+BasicSubString OrdinaryValueOfName(LSVariable* v, VarFrame* frame) {
+    auto* m = dynamic_cast<LSMacroVariable*>(v);
+    if (!m || m->GetNumArgs() != 0 || m->IsPython() || m->IsNaked() || m->GetReturnType() != LSV_Macro) return {};
+    const BasicSubString body = m->GetSubstitutionString();
+    VarFrame* context = m->GetContext() ? m->GetContext() : frame;
+    if (body.empty() || std::find(body.begin(), body.end(), '\n') != body.end() ||
+        !IsOrdinaryTextIn(body, context, DollarMacrosActive(context)))
+        return {};
+    return body;
 }
 
 }  // namespace orvan

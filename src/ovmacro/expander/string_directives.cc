@@ -5,7 +5,10 @@
 
 #include "ovmacro/expander/held_text.h"
 #include "ovmacro/expander/directive_text.h"
+#include "ovmacro/expander/expansion_observer.h"
 #include "ovmacro/expander/macro_expander.h"
+#include "ovmacro/expander/nesting_guard.h"
+#include "ovmacro/expander/plain_text.h"
 #include "ovmacro/expr/expression_parser.h"
 #include "ovmacro/foundations/compose.h"
 #include "ovmacro/foundations/scanning.h"
@@ -55,14 +58,31 @@ void MacroExpander::ProcessStrDirective(bool isX, EStrLiteralMode mode) {
     int64 indent = 0;
     const BasicSubString argument = ScanRndBrackettedString(cursor, indent);
     AdvanceWritePos(cursor.begin(), false);
-    const basic_xstring expanded = ExpandInChildFrame(frame, argument, indent);
+    // The commonest argument, one name whose value is ordinary text (a loop name over a list of display
+    // names), is taken as it stands: the same text, nesting levels and output count as its expansion.
+    BasicSubString expanded;
+    basic_xstring storage;
+    BasicSubString name = argument;
+    if (ScanIdentifier(name) && name.empty() && !ExpansionObserver::CallWatcher()) {
+        const BasicSubString word(argument.begin(), name.begin());
+        expanded = OrdinaryValueOfName(FindVariable(word), frame);
+        if (!expanded.empty()) {
+            const MacroNestingGuard argumentLevel(argument.begin()), bodyLevel(expanded.begin());
+            MacroNestingGuard::ChargeOutput(expanded.size(), expanded.begin());
+        }
+    }
+    if (expanded.empty()) {
+        storage = ExpandInChildFrame(frame, argument, indent);
+        expanded = BasicSubString(storage);
+    }
 
     const OutputIndentOverride lineUp(outputIndent, GetOutputPos());
-    StringStream literal;
+    StringStream literal(static_cast<size_t>(expanded.size()) + 8);
     WritePrefix(literal, mode);
     bool wroteLine = false;
-    for (const char c : expanded) {
-        if (isX && c == '\n') {
+    if (!isX) WriteTextForCStyleLiteralConstants(literal, expanded);
+    for (const char c : isX ? expanded.view() : std::string_view()) {
+        if (c == '\n') {
             // One literal per line: the line feed stays inside the literal as \n, and the next literal
             // starts on a new output line, lined up under the first.
             literal << "\\n";

@@ -4,8 +4,10 @@
 
 #include <cerrno>
 #include <cstring>
+#include <utility>
 
 #include <fcntl.h>
+#include <sys/mman.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -62,6 +64,40 @@ bool ReadStringFromFile(const basic_xstring& path, basic_xstring& out, bool text
     if (!ok) return false;
     if (textMode) ConvertCrLfToLf(text);
     out.swap(text);
+    return true;
+}
+
+MappedFile& MappedFile::operator=(MappedFile&& other) noexcept {
+    if (this != &other) {
+        this->~MappedFile();
+        data_ = std::exchange(other.data_, nullptr);
+        size_ = other.size_;
+    }
+    return *this;
+}
+
+MappedFile::~MappedFile() {
+    if (data_) ::munmap(const_cast<char*>(data_), size_);
+}
+
+bool MappedFile::MapTextFile(const basic_xstring& path, int64 minSize, MappedFile& out) {
+    const int fd = ::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK);
+    if (fd < 0) return false;
+    struct stat st {};
+    void* p = MAP_FAILED;
+    if (::fstat(fd, &st) == 0 && S_ISREG(st.st_mode) && st.st_size >= minSize && st.st_size > 0)
+        p = ::mmap(nullptr, static_cast<size_t>(st.st_size), PROT_READ, MAP_PRIVATE | MAP_POPULATE, fd, 0);
+    ::close(fd);
+    if (p == MAP_FAILED) return false;
+    MappedFile mapped;
+    mapped.data_ = static_cast<const char*>(p);
+    mapped.size_ = static_cast<size_t>(st.st_size);
+    // A CR LF must become LF, which a mapping cannot do: such a file is read instead.
+    for (const char* cr = mapped.data_; (cr = static_cast<const char*>(
+                                             std::memchr(cr, '\r', mapped.size_ - static_cast<size_t>(cr - mapped.data_))));
+         ++cr)
+        if (cr + 1 < mapped.data_ + mapped.size_ && cr[1] == '\n') return false;
+    out = std::move(mapped);
     return true;
 }
 

@@ -75,6 +75,18 @@ void WriteEscapedChar(xostream& os, char c, char quote) {
 
 void WriteCharForCStyleLiteralConstants(xostream& os, char c) { WriteEscapedChar(os, c, '"'); }
 
+void WriteTextForCStyleLiteralConstants(xostream& os, BasicSubString text) {
+    const char* run = text.begin();
+    for (const char* p = text.begin(); p < text.end(); ++p) {
+        const unsigned char u = static_cast<unsigned char>(*p);
+        if (u >= 0x20 && u != 0x7f && u != '"' && u != '\\') continue;
+        os.put(run, p - run);  // the characters that stand for themselves go out in one run
+        WriteEscapedChar(os, *p, '"');
+        run = p + 1;
+    }
+    os.put(run, text.end() - run);
+}
+
 basic_xstring MakeDoubleQuotedString(BasicSubString text) {
     StringStream ss(static_cast<size_t>(text.size()) + 2);
     ss.put('"');

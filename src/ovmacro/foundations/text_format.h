@@ -20,6 +20,8 @@ int64 FormatDouble(double v, char* buf);
 // Escapes one character for a double-quoted C literal: printable ASCII and bytes >= 0x80 as they are; the
 // double quote and backslash with a backslash; LF, CR and tab as \n, \r, \t; other control bytes as \ooo.
 void WriteCharForCStyleLiteralConstants(xostream& os, char c);
+// The same for each character of a text, as the body of one double-quoted literal.
+void WriteTextForCStyleLiteralConstants(xostream& os, BasicSubString text);
 // The text as a double-quoted C literal, escaped as above.
 basic_xstring MakeDoubleQuotedString(BasicSubString text);
 // The character as a single-quoted C literal (the single quote is escaped instead of the double quote, and

@@ -7,6 +7,7 @@
 #include "ovmacro/foundations/compose.h"
 #include "ovmacro/foundations/scanning.h"
 #include "ovmacro/lexer/bracket_index.h"
+#include "ovmacro/lexer/char_classes.h"
 #include "ovmacro/lexer/exceptions.h"
 #include "ovmacro/lexer/token_scanner.h"
 
@@ -22,6 +23,18 @@ using HR = HumanReadableCharInSubString;
 
 [[noreturn]] void Fail(const basic_xstring& message, const char* position) {
     throw LexScannerException(message, position);
+}
+
+// The character of a bracket kind.
+char BracketChar(EToken bracket) {
+    switch (bracket) {
+        case TK_LPAREN: return '(';
+        case TK_RPAREN: return ')';
+        case TK_LBRACE: return '{';
+        case TK_RBRACE: return '}';
+        case TK_LBRACKET: return '[';
+        default: return ']';
+    }
 }
 
 // The closing partner of an opening bracket kind, or TK_NONE for any other kind.
@@ -214,9 +227,56 @@ void DecodeQuotedString(BasicSubString s, xostream* os, const char* endName) {
     if (os) os->put(run, s.begin() - run);
 }
 
-}  // namespace
+// Skips the tokens of an argument that can neither fail nor open, close or end anything (names, plain
+// integers, quoted literals, operators, the punctuation "#.;~\\`", and inside a group of brackets any
+// comma or bracket but the group's own `open` and `close`) and the white space between them, and stops
+// before any other, which the token scanner reads. Returns the end of the last token skipped, or null.
+const char* SkipQuietTokens(BasicSubString& s, char open, char close) {
+    const char* p = s.begin();
+    const char* const end = s.end();
+    const char* last = nullptr;
+    while (p < end) {
+        if (*p == ' ') {  // the commonest byte between tokens
+            ++p;
+            continue;
+        }
+        switch (ClassOf(*p)) {
+            case CharClass::kWhiteSpace:
+            case CharClass::kLineFeed: ++p; continue;
+            case CharClass::kIdentifier:
+                if (BeginsRawLiteral(p, end)) break;
+                for (++p; p < end && IsIdentifierChar(*p);) ++p;
+                last = p;
+                continue;
+            case CharClass::kDigit:
+                if (const char* q = EndOfPlainInteger(p, end)) {
+                    last = p = q;
+                    continue;
+                }
+                break;
+            case CharClass::kOperator: last = ++p; continue;
+            case CharClass::kSingle:
+                if (open ? *p == open || *p == close
+                         : *p == ',' || *p == '(' || *p == ')' || *p == '[' || *p == ']' || *p == '{' || *p == '}')
+                    break;
+                last = ++p;
+                continue;
+            case CharClass::kSingleQuote:
+            case CharClass::kDoubleQuote: {
+                BasicSubString literal(p, end);
+                LsScanLiteralString(literal, *p, *p == '\'' ? "single quoted string" : "double quoted string");
+                last = p = literal.begin();
+                continue;
+            }
+            default: break;
+        }
+        break;
+    }
+    s.SetBegin(p);
+    return last;
+}
 
-LSToken ScanArgument(BasicSubString& s, BasicSubString& arg, EToken terminator) {
+LSToken ScanArgumentIn(BasicSubString& s, BasicSubString& arg, EToken terminator, bool skipQuietTokens) {
     ScanWhiteSpace(s);
     const char* start = s.begin();
 
@@ -260,6 +320,13 @@ LSToken ScanArgument(BasicSubString& s, BasicSubString& arg, EToken terminator) 
     int64 depth = 0;
     for (;;) {
         arg.SetEnd(s.begin());
+        if (skipQuietTokens) {
+            // Inside a group only its own brackets count, unless their ends are being recorded.
+            const bool grouped = depth > 0 && !recording;
+            const char open = grouped ? BracketChar(trackedOpen) : '\0';
+            if (const char* quietEnd = SkipQuietTokens(s, open, grouped ? BracketChar(trackedClose) : '\0'))
+                arg.SetEnd(quietEnd);
+        }
         const LSToken t = LsScanToken(s, false);
         if (t.type == TK_EOS) {
             StringStream ss;
@@ -291,6 +358,17 @@ LSToken ScanArgument(BasicSubString& s, BasicSubString& arg, EToken terminator) 
             }
         }
     }
+}
+
+}  // namespace
+
+LSToken ScanArgument(BasicSubString& s, BasicSubString& arg, EToken terminator) {
+    // Quiet tokens are those that cannot be the terminator either: a closing bracket, as for every caller.
+    return ScanArgumentIn(s, arg, terminator, terminator == TK_RPAREN || terminator == TK_RBRACKET);
+}
+
+LSToken ScanArgumentTokenByToken(BasicSubString& s, BasicSubString& arg, EToken terminator) {
+    return ScanArgumentIn(s, arg, terminator, false);
 }
 
 BasicSubString ScanBrackettedSection(BasicSubString& s, bool readOpen, EToken open, EToken close) {

@@ -22,6 +22,9 @@ namespace orvan {
 // `terminator` outside brackets. Returns the token that ended it; `arg` excludes the white space and comments
 // in front of that token.
 LSToken ScanArgument(BasicSubString& s, BasicSubString& arg, EToken terminator);
+// The same, each token read by the token scanner: the plain way that ScanArgument's skipping of quiet tokens
+// mirrors (for tests).
+LSToken ScanArgumentTokenByToken(BasicSubString& s, BasicSubString& arg, EToken terminator);
 
 // The inside of a bracketed section, nested brackets of the same kind balanced. With readOpen the opening
 // bracket is read first; otherwise the caller has consumed it. `s` is left after the closing bracket.

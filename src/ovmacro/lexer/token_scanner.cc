@@ -62,9 +62,22 @@ bool IsDoublingOperator(char c) {
 
 LSToken LsScanToken(BasicSubString& s, bool returnComments) {
     for (;;) {
-        ScanWhiteSpace(s);
-        if (s.empty()) return LSToken(TK_EOS, s.end(), s.end());
         const char* start = s.begin();
+        while (start < s.end() && IsWhiteSpace(*start)) ++start;
+        s.SetBegin(start);
+        if (start == s.end()) return LSToken(TK_EOS, start, start);
+        // The commonest tokens, words and punctuation, are read here without the general helper.
+        const CharClass k = ClassOf(*start);
+        if (k == CharClass::kSingle) {
+            s.SetBegin(start + 1);
+            return LSToken(SingleCharacterKind(*start), start, start + 1);
+        }
+        if (k == CharClass::kIdentifier && !BeginsRawLiteral(start, s.end())) {
+            const char* end = start + 1;
+            while (end < s.end() && IsIdentifierChar(*end)) ++end;
+            s.SetBegin(end);
+            return LSToken(TK_IDENTIFIER, start, end);
+        }
         const EToken kind = LsScanTokenHelper(s);
         if (kind == TK_COMMENT && !returnComments) continue;
         return LSToken(kind, start, s.begin());

@@ -93,6 +93,15 @@ MpfwSourceFile* MpfwParser::CreateMpfwSourceFile() {
 }
 
 MpfwSourceFile* MpfwParser::AddFile(const basic_xstring& path, BasicSubString extra) {
+    // Large enough that mapping costs less than copying.
+    constexpr int64 kMappedSize = 256 * 1024;
+    MappedFile mapped;
+    if (mapLargeFiles_ && extra.empty() && MappedFile::MapTextFile(path, kMappedSize, mapped)) {
+        std::unique_ptr<MpfwSourceFile> file(CreateMpfwSourceFile());
+        file->fileName = path;
+        file->mapped = std::move(mapped);
+        return AddFileRecord(std::move(file));
+    }
     basic_xstring text;
     if (!ReadStringFromFile(path, text, true)) throw LexScannerException("Couldn't open file " + path, token);
     text.append(extra.view());
@@ -100,21 +109,31 @@ MpfwSourceFile* MpfwParser::AddFile(const basic_xstring& path, BasicSubString ex
 }
 
 MpfwSourceFile* MpfwParser::AddFileWithText(const basic_xstring& name, basic_xstring text) {
-    std::unique_ptr<MpfwSourceFile> owned(CreateMpfwSourceFile());
-    MpfwSourceFile* file = owned.get();
+    std::unique_ptr<MpfwSourceFile> file(CreateMpfwSourceFile());
     file->fileName = name;
     file->text = std::move(text);
+    return AddFileRecord(std::move(file));
+}
+
+MpfwSourceFile* MpfwParser::AddFileRecord(std::unique_ptr<MpfwSourceFile> owned) {
+    MpfwSourceFile* file = owned.get();
+    const basic_xstring& name = file->fileName;
     mpfwFrame->sourceFiles.AddSrcFile(owned.release());
 
+    xostream* stream = expanding_.empty() ? std::exchange(stream_, nullptr) : nullptr;
     ExpansionChainEntry entry(expanding_, name);
     const RestrictedLoad restrictedLoad(restricted_, restrictions_);
     const ExpandingFiles expanding(mpfwFrame->sourceFiles);
     try {
-        if (keepOutputPieces_)
-            MacroExpand(this, &mpfwFrame->varFrame, BasicSubString(file->text), 0, 0, file->expandedText,
+        if (stream) {
+            ExpandedOutput output(stream, false);
+            output.GatherShortRuns();
+            MacroExpand(this, &mpfwFrame->varFrame, file->Text(), 0, 0, output);
+        } else if (keepOutputPieces_)
+            MacroExpand(this, &mpfwFrame->varFrame, file->Text(), 0, 0, file->expandedText,
                         file->pieces);
         else
-            MacroExpand(this, &mpfwFrame->varFrame, BasicSubString(file->text), 0, 0, file->expandedText);
+            MacroExpand(this, &mpfwFrame->varFrame, file->Text(), 0, 0, file->expandedText);
     } catch (LexScannerException& e) {
         // An imported file's expansion is not the outermost one, which would otherwise count the context
         // lines left out; the report is written here, so count them here.

@@ -21,6 +21,8 @@
 // The frame, its list and the recorded files must outlive the parser.
 #pragma once
 
+#include <memory>
+
 #include "ovmacro/expander/import_handler.h"
 #include "ovmacro/expander/nesting_guard.h"
 #include "ovmacro/expr/expression_parser.h"
@@ -58,6 +60,14 @@ public:
     // A host that only writes the expanded texts, and neither reads settings from them nor maps their
     // positions back, saves the pieces' memory: a few pieces for every macro call.
     void SetKeepOutputPieces(bool keep) { keepOutputPieces_ = keep; }
+    // Writes the expansion of the next file loaded at the top (not through an import) into `stream` as it is
+    // made, instead of keeping it in the file's record (whose expandedText stays empty, without pieces): a host
+    // that only writes the expansion out needs no memory for it. What reached the stream before an error stays
+    // there; the host discards it.
+    void StreamNextExpansion(xostream* stream) { stream_ = stream; }
+    // Whether AddFile maps a large file into memory instead of reading it (the record's text then stays empty;
+    // its Text() is the mapping): a host that reads the records' texts through Text() saves the copy.
+    void SetMapLargeFiles(bool map) { mapLargeFiles_ = map; }
     // Whether the expansions of the files loaded from now on keep their @import lines (they do by default).
     // The reading steps meet an imported file's settings at its import, so a host that reads settings keeps
     // them; a host that writes the expanded texts as generated code drops them, each with its line, as a @def
@@ -133,6 +143,10 @@ private:
 
     xvector<basic_xstring> expanding_;
     bool keepOutputPieces_ = true;
+    xostream* stream_ = nullptr;
+    bool mapLargeFiles_ = false;
+    // Records the file (its text or its mapping set) and expands it.
+    MpfwSourceFile* AddFileRecord(std::unique_ptr<MpfwSourceFile> file);
     bool keepImportDirectives_ = true;
     bool restricted_ = false;
     MpfwRestrictions restrictions_;

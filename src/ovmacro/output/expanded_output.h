@@ -39,6 +39,23 @@ public:
     void WriteSubStringFromSourceFile(BasicSubString s, int64 indent) {
         if (!TryGatherShortRun(s, indent)) WriteCopiedRuns(s, indent);
     }
+    // The longest run that TryGatherLineFreeRun takes.
+    static constexpr int64 kMaxLineFreeRun = 32;
+    // Copied text that the caller knows to hold no line feed and no tab (a word, a cached part of a body): the
+    // same as WriteSubStringFromSourceFile without looking at its characters. False, having written nothing,
+    // when it is empty or longer than kMaxLineFreeRun, when runs are not gathered, or when its line still waits
+    // for its indentation.
+    bool TryGatherLineFreeRun(BasicSubString s, int64 indent) {
+        const int64 n = s.size();
+        if (!gather_ || n <= 0 || n > kMaxLineFreeRun || (column_ < 0 && indent > 0)) return false;
+        if (n > kBufferSize - buffered_) Flush();
+        std::memcpy(buffer_ + buffered_, s.begin(), static_cast<size_t>(n));
+        buffered_ += n;
+        charCount_ += n;
+        column_ = (column_ < 0 ? 0 : column_) + n;
+        AddPiece(OutputPiece(s, 0));
+        return true;
+    }
     // Calculated text: all of it (its inserted indentation included) maps back to `source`.
     void WriteCalculatedSubString(BasicSubString s, BasicSubString source, int64 indent);
     // The column in the current line; -1 at the start of a line whose indentation is not yet written.

@@ -9,10 +9,10 @@ namespace orvan {
 
 namespace {
 
-bool LineInText(const basic_xstring& text, const basic_xstring& name, const char* pos,
-                basic_xstring& fileName, int64& line) {
+bool LineInText(BasicSubString text, const basic_xstring& name, const char* pos, basic_xstring& fileName,
+                int64& line) {
     if (!pos) return false;
-    const int64 n = GetLineNumber(BasicSubString(text), pos);
+    const int64 n = GetLineNumber(text, pos);
     if (n < 0) return false;
     fileName = name;
     line = n;
@@ -40,7 +40,7 @@ bool StringContainsPos(const basic_xstring& s, const char* pos) {
 }
 
 bool LSSourceFile::GetFilenameAndLineNumber(const char* pos, basic_xstring& name, int64& line) const {
-    return LineInText(text, fileName, pos, name, line);
+    return LineInText(BasicSubString(text), fileName, pos, name, line);
 }
 
 bool LSSourceFileList::GetFilenameAndLineNumber(const char* pos, basic_xstring& fileName, int64& line) const {
@@ -53,7 +53,7 @@ bool LSSourceFileList::GetFilenameAndLineNumber(const char* pos, basic_xstring& 
 MpfwSourceFile::~MpfwSourceFile() = default;
 
 bool MpfwSourceFile::GetFilenameAndLineNumber(const char* pos, basic_xstring& name, int64& line) const {
-    return LineInText(text, fileName, pos, name, line);
+    return LineInText(Text(), fileName, pos, name, line);
 }
 
 void MpfwSourceFile::AdjustErrorPosition(LexScannerException& e) const {
@@ -76,7 +76,9 @@ bool MpfwSourceFileList::GetFilenameAndLineNumber(const char* pos, basic_xstring
 
 int64 MpfwSourceFileList::GetSrcFileIndexContainingPosition(const char* pos) const {
     for (size_t i = 0; i < files_.size(); ++i)
-        if (StringContainsPos(files_[i]->text, pos)) return static_cast<int64>(i);
+        if (const BasicSubString t = files_[i]->Text(); pos && std::less_equal<const char*>()(t.begin(), pos) &&
+                                                         std::less<const char*>()(pos, t.end()))
+            return static_cast<int64>(i);
     return -1;
 }
 

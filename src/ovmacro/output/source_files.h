@@ -16,6 +16,7 @@
 #include <memory>
 #include <utility>
 
+#include "ovmacro/foundations/files.h"
 #include "ovmacro/foundations/stream.h"
 #include "ovmacro/foundations/sub_string.h"
 #include "ovmacro/foundations/types.h"
@@ -74,6 +75,8 @@ public:
     MpfwSourceFile& operator=(const MpfwSourceFile&) = delete;
     virtual ~MpfwSourceFile();
 
+    // The source text: `text`, or the mapped file when the parser mapped a large file instead of reading it.
+    BasicSubString Text() const { return mapped ? mapped.view() : BasicSubString(text); }
     // As LSSourceFile's, over the source text (not the expanded text).
     bool GetFilenameAndLineNumber(const char* pos, basic_xstring& fileName, int64& line) const;
     // Moves e's position from expandedText back to the source address that produced that character; a
@@ -81,7 +84,8 @@ public:
     void AdjustErrorPosition(LexScannerException& e) const;
 
     basic_xstring fileName;
-    basic_xstring text;          // as read, followed by any text the host appended
+    basic_xstring text;          // as read, followed by any text the host appended; empty when mapped
+    MappedFile mapped;           // a large file mapped rather than read (MpfwParser::SetMapLargeFiles)
     basic_xstring expandedText;  // the expansion of text
     OutputPieces pieces;         // recorded while expandedText was produced
 };

@@ -2,7 +2,9 @@
 // the shared `__main__` namespace, reading Python's error text, writing Python values as text, shut-down.
 //
 // One interpreter serves the whole process. It starts with the first @runpython block or Python macro and
-// lives until UninitPython; names defined in `__main__` persist for that whole time. Python's sys.stdout goes
+// lives until UninitPython; the bridge module that links the Python runtime (libovMacroExpander-python.so,
+// beside the library, or the file OVMACRO_PYTHON_MODULE names) is loaded then, so that a process that runs no
+// Python never loads it, and a machine without Python fails only the Python directives; names defined in `__main__` persist for that whole time. Python's sys.stdout goes
 // to xcout() and sys.stderr to xcerr(); the text of an error goes into s_errorString. The calls that would end
 // the process (os._exit, os.abort, the os.exec family, signals to the process itself) raise an error instead.
 // All calls must come from one thread at a time.
@@ -46,6 +48,9 @@ private:
 // interpreter is started and every Python directive or Python macro fails.
 void SetPythonAllowed(bool allowed);
 bool IsPythonAllowed();
+// Where to look for the bridge module when it is neither beside the library nor in ../lib beside a program
+// that links the library in (a program run from its build tree).
+void SetPythonModuleFallback(const basic_xstring& path);
 
 // Starts the interpreter unless it runs already; false with the reason in error if it is not usable.
 bool InitPython(basic_xstring& error);
@@ -65,11 +70,5 @@ void EvalPythonExpression(const basic_xstring& expression, basic_xstring& result
 void RunPython(const basic_xstring& fileName, const basic_xstring& code, const char* position);
 // Writes an int, float, str or list (of such values) as text; other types raise at position.
 void WritePythonObject(xostream& os, _object* object, const char* position);
-
-// The built-in module `stream_hooks` through which the bootstrap redirects sys.stdout and sys.stderr.
-_object* PyInit_stream_hooks();
-_object* WriteToStdOut(_object* self, _object* args);
-_object* WriteToStdErr(_object* self, _object* args);
-_object* WriteToErrorText(_object* self, _object* args);
 
 }  // namespace orvan
