@@ -27,16 +27,21 @@ void ParseDirectiveText(VarFrame* frame, const basic_xstring& expanded, BasicSub
     }
 }
 
-bool EvaluateConditionText(VarFrame* frame, BasicSubString condition, BasicSubString name, const char* at) {
+basic_xstring ExpandDirectiveText(VarFrame* frame, BasicSubString text, BasicSubString name) {
     basic_xstring expanded;
     try {
         VarFrame child(frame);
-        MacroExpand(nullptr, &child, condition, 0, 0, expanded);
+        MacroExpand(nullptr, &child, text, 0, 0, expanded);
     } catch (LexScannerException& e) {
-        // A call-chain line: a condition that invokes itself would otherwise add one line per level.
-        e.AppendCallContextLine(Compose("\n    in ", name, "(", condition, ")"));
+        // A call-chain line: a text that invokes itself would otherwise add one line per level.
+        e.AppendCallContextLine(Compose("\n    in ", name, "(", text, ")"));
         throw;
     }
+    return expanded;
+}
+
+bool EvaluateConditionText(VarFrame* frame, BasicSubString condition, BasicSubString name, const char* at) {
+    const basic_xstring expanded = ExpandDirectiveText(frame, condition, name);
     bool value = false;
     ParseDirectiveText(frame, expanded, name, at, [&](ExpressionParser& p) { value = p.ParseBool(false); });
     return value;

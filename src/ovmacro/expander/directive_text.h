@@ -17,8 +17,11 @@ namespace orvan {
 void ParseDirectiveText(VarFrame* frame, const basic_xstring& expanded, BasicSubString name, const char* at,
                         const std::function<void(ExpressionParser&)>& parse);
 
-// Expands `condition` in a child frame of `frame` and evaluates it as a bool with ParseDirectiveText. An error
-// of the expansion keeps its place and gets "\n    in NAME(condition)".
+// Expands the bracketed `text` of the directive `name` in a child frame of `frame`. An error of the expansion
+// keeps its place and gets "\n    in NAME(text)".
+basic_xstring ExpandDirectiveText(VarFrame* frame, BasicSubString text, BasicSubString name);
+
+// Expands `condition` with ExpandDirectiveText and evaluates it as a bool with ParseDirectiveText.
 bool EvaluateConditionText(VarFrame* frame, BasicSubString condition, BasicSubString name, const char* at);
 
 }  // namespace orvan

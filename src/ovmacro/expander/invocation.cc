@@ -236,14 +236,7 @@ void ReadVariableValueByParsingExpression(VarFrame* frame, BasicSubString text, 
 }
 
 basic_xstring MacroExpander::EvaluateString(BasicSubString sectionText, BasicSubString directiveName) {
-    basic_xstring expanded;
-    try {
-        VarFrame child(frame);
-        MacroExpand(nullptr, &child, sectionText, 0, 0, expanded);
-    } catch (LexScannerException& e) {
-        e.AppendCallContextLine(Compose("\n    in ", directiveName, "(", sectionText, ")"));
-        throw;
-    }
+    const basic_xstring expanded = ExpandDirectiveText(frame, sectionText, directiveName);
     basic_xstring result;
     ParseDirectiveText(frame, expanded, directiveName, currentToken.begin(),
                        [&](ExpressionParser& p) { result = p.ParseString(false); });
