@@ -385,31 +385,21 @@ void Release(PyObject* object) { Py_XDECREF(object); }
 
 PyObject* PyInit_stream_hooks() { return PyModule_Create(&s_streamHooksModule); }
 
-PyObject* WriteToStdOut(PyObject* /*self*/, PyObject* args) {
-    const char* text = nullptr;
-    Py_ssize_t size = 0;
-    // The sized form writes text with embedded zero characters whole instead of refusing it.
-    if (!PyArg_ParseTuple(args, "s#", &text, &size)) return nullptr;
-    xcout().put(text, size);
-    xcout().flush();
-    Py_RETURN_NONE;
-}
-
-PyObject* WriteToStdErr(PyObject* /*self*/, PyObject* args) {
+// Writes the one text argument of a hook into `out`, flushed when `flush`. The sized form writes text with
+// embedded zero characters whole instead of refusing it.
+PyObject* WriteArgumentTo(PyObject* args, xostream& out, bool flush) {
     const char* text = nullptr;
     Py_ssize_t size = 0;
     if (!PyArg_ParseTuple(args, "s#", &text, &size)) return nullptr;
-    xcerr().put(text, size);
-    xcerr().flush();
+    out.put(text, size);
+    if (flush) out.flush();
     Py_RETURN_NONE;
 }
 
+PyObject* WriteToStdOut(PyObject* /*self*/, PyObject* args) { return WriteArgumentTo(args, xcout(), true); }
+PyObject* WriteToStdErr(PyObject* /*self*/, PyObject* args) { return WriteArgumentTo(args, xcerr(), true); }
 PyObject* WriteToErrorText(PyObject* /*self*/, PyObject* args) {
-    const char* text = nullptr;
-    Py_ssize_t size = 0;
-    if (!PyArg_ParseTuple(args, "s#", &text, &size)) return nullptr;
-    s_errorString.put(text, size);
-    Py_RETURN_NONE;
+    return WriteArgumentTo(args, s_errorString, false);
 }
 
 constexpr PythonModule kModule = {Start, Stop, TakeError, Evaluate, Write, Run, Release};
