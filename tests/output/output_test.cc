@@ -122,15 +122,15 @@ TEST(SourceFileList, PositionsBelongToTheFileThatHoldsThem) {
     MpfwSourceFileList files;
     for (const char* text : {"a\nb", "x\ny\nz"}) {
         auto* f = new MpfwSourceFile;
-        f->fileName = text[0] == 'a' ? "base.cfg" : "other.cfg";
+        f->fileName = text[0] == 'a' ? "base.cfg" : "zone.cfg";
         f->text = text;
         files.AddSrcFile(f);
     }
     const basic_xstring& other = files[1]->text;
     const std::tuple<const char*, int64, const char*, int64> cases[] = {
-        {other.data() + 4, 1, "other.cfg", 3},
+        {other.data() + 4, 1, "zone.cfg", 3},
         {files[0]->text.data(), 0, "base.cfg", 1},
-        {other.data() + other.size(), -1, "other.cfg", 3},  // an error at the end is on the last line
+        {other.data() + other.size(), -1, "zone.cfg", 3},  // an error at the end is on the last line
         {"elsewhere", -1, nullptr, 0},
         {nullptr, -1, nullptr, 0},
     };
@@ -142,6 +142,10 @@ TEST(SourceFileList, PositionsBelongToTheFileThatHoldsThem) {
         EXPECT_EQ(foundName, name ? name : "none");
         EXPECT_EQ(foundLine, line);
     }
+    // A file is found by its name, whatever the case of its letters.
+    EXPECT_EQ(files.FindSourceFile("ZONE.cfg"), files[1]);
+    EXPECT_EQ(files.FindSourceFile("Base.CFG"), files[0]);
+    EXPECT_EQ(files.FindSourceFile("base"), nullptr);
 }
 
 }  // namespace
