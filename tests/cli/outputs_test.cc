@@ -122,6 +122,10 @@ TEST(OutputFiles, AWritableFileInAReadOnlyFolderIsUpdatedInPlace) {
         GTEST_SKIP() << "the tool cannot run as an unprivileged user from this folder";
     EXPECT_EQ(RunTool({"-o", out, in}, "", "", asNobody, nullptr).exitCode, 0);
     EXPECT_EQ(ReadFile(out), "new");
+    // A file not there yet cannot be made, and the report says why.
+    const std::string absent = (dir.path() / "ro/absent.txt").string();
+    EXPECT_EQ(RunTool({"-o", absent, in}, "", "", asNobody, nullptr).err,
+              "ovmacro: cannot write " + absent + ": Permission denied\n");
 }
 
 // A run ended by a signal while it works leaves OUT as it was and no file of its own behind.

@@ -193,10 +193,10 @@ bool OutputFiles::StageReplacement(Output& out, std::string& error) {
         }
         if (out.fd >= 0) RegisterTempName(out.tempName); else out.tempName.clear();
     }
+    const int reason = errno;  // read before stat, which may set it again
     struct stat st {};
     const bool exists = ::stat(out.target.c_str(), &st) == 0;
     if (out.fd < 0) {
-        const int reason = errno;
         // A folder that may not be written, holding a file that may: the file is rewritten where it is.
         if (exists && (reason == EACCES || reason == EPERM || reason == EROFS)) {
             out.fd = ::open(out.target.c_str(), O_WRONLY | O_CLOEXEC);
